@@ -1,0 +1,84 @@
+// SPDX-License-Identifier: MIT
+//
+// The registry: the system's own on Windows, the machine folder's `registry.db` on Linux. Keys and value names compare without
+// regard to case and keep the spelling of their first writer. Paths are written with backslashes. Every write that has returned
+// holds, also when the process is killed right behind it. Any control thread; a key object belongs to one thread at a time.
+#pragma once
+
+#include <cstdint>
+#include <memory>
+#include <optional>
+#include <span>
+#include <vector>
+
+#include "platform/status.h"
+#include "platform/text.h"
+
+namespace vxcomn {
+
+enum class RegistryRoot : uint8_t { localMachine = 0, currentUser = 1, users = 2, classesRoot = 3 };
+
+// Numbers as in winnt.h.
+enum class RegistryType : uint32_t { none = 0, sz = 1, expandSz = 2, binary = 3, dword = 4, multiSz = 7, qword = 11 };
+
+// The rights that a key is opened with, as in winnt.h. The 64-bit view is always meant.
+enum class RegistryAccess : uint32_t { read = 0x20119, write = 0x20106, readWrite = 0x2011F, all = 0xF013F };
+
+struct RegistryValue {
+    RegistryType type = RegistryType::none;
+    std::vector<uint8_t> data;  // as stored; text is UTF-16 little-endian, usually with its end
+};
+
+// What reading one value came to.
+enum class RegistryRead : uint8_t { value, absent, wrongType };
+
+class RegistryKey {
+  public:
+    RegistryKey() noexcept;
+    RegistryKey(RegistryKey &&) noexcept;
+    RegistryKey &operator=(RegistryKey &&) noexcept;
+    ~RegistryKey();
+
+    // Opens a key that exists: 0, 2 if there is none, 5 without the right.
+    static Status open(RegistryRoot root, WideView path, RegistryAccess access, RegistryKey &key);
+    // Opens a key and makes it, with all above it, where it is missing. `created` (if given) tells whether it was.
+    static Status create(RegistryRoot root, WideView path, RegistryAccess access, RegistryKey &key, bool *created = nullptr);
+    // The same, below an open key.
+    Status openBelow(WideView path, RegistryAccess access, RegistryKey &key) const;
+    Status createBelow(WideView path, RegistryAccess access, RegistryKey &key, bool *created = nullptr) const;
+
+    explicit operator bool() const noexcept;
+    void close() noexcept;
+
+    // A value of any type. The empty name is the key's own ("default") value.
+    Status query(WideView name, RegistryValue &value) const;
+    // Typed reads. A 32-bit value is a REG_DWORD or 4 bytes of REG_BINARY, a 64-bit value a REG_QWORD or 8 bytes of REG_BINARY, text
+    // is REG_SZ up to its first end or that of its data, bytes are REG_BINARY of at most `limit` bytes. Outputs are left alone
+    // unless the answer is `value`.
+    RegistryRead readU32(WideView name, uint32_t &value) const;
+    RegistryRead readU64(WideView name, uint64_t &value) const;
+    RegistryRead readText(WideView name, WideString &value) const;
+    RegistryRead readBytes(WideView name, std::vector<uint8_t> &value, size_t limit) const;
+
+    Status set(WideView name, RegistryType type, std::span<const uint8_t> data);
+    Status setU32(WideView name, uint32_t value);
+    Status setU64(WideView name, uint64_t value);
+    Status setText(WideView name, WideView value);
+    Status setBytes(WideView name, std::span<const uint8_t> data);
+    Status deleteValue(WideView name);
+
+    // Deletes a key below this one; 5 if that has keys below itself (on both platforms).
+    Status deleteBelow(WideView path);
+    // Deletes a key below this one with all that is in it.
+    Status deleteTreeBelow(WideView path);
+
+    // The names, in the order of their making on Linux and in the system's order on Windows; compare as sets.
+    Status subkeys(std::vector<WideString> &names) const;
+    Status values(std::vector<WideString> &names) const;
+
+  private:
+    struct Impl;
+    std::unique_ptr<Impl> impl_;
+};
+
+}  // namespace vxcomn
