@@ -52,8 +52,8 @@ class RegistryKey {
 
     // A value of any type. The empty name is the key's own ("default") value.
     Status query(WideView name, RegistryValue &value) const;
-    // Typed reads. A 32-bit value is a REG_DWORD or 4 bytes of REG_BINARY, a 64-bit value a REG_QWORD or 8 bytes of REG_BINARY, text
-    // is REG_SZ up to its first end or that of its data, bytes are REG_BINARY of at most `limit` bytes. Outputs are left alone
+    // Typed reads. A 32-bit value is a REG_DWORD or 4 bytes of REG_BINARY, a 64-bit value a REG_QWORD or 8 bytes of REG_BINARY,
+    // text is REG_SZ up to its first end or that of its data, bytes are REG_BINARY of at most `limit` bytes. Outputs are left alone
     // unless the answer is `value`.
     RegistryRead readU32(WideView name, uint32_t &value) const;
     RegistryRead readU64(WideView name, uint64_t &value) const;
@@ -69,7 +69,7 @@ class RegistryKey {
 
     // Deletes a key below this one; 5 if that has keys below itself (on both platforms).
     Status deleteBelow(WideView path);
-    // Deletes a key below this one with all that is in it.
+    // Deletes a key below this one with all that is in it; with an empty path all that is in this key, which itself stays.
     Status deleteTreeBelow(WideView path);
 
     // The names, in the order of their making on Linux and in the system's order on Windows; compare as sets.

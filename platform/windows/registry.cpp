@@ -1,0 +1,181 @@
+// SPDX-License-Identifier: MIT
+//
+// The system's own registry.
+#include "platform/registry.h"
+
+#include "platform/unique.h"
+#include "platform/windows/sdk.h"
+
+namespace vxcomn {
+namespace {
+
+struct KeyTraits {
+    using Raw = HKEY;
+    static constexpr Raw none = nullptr;
+    static void close(Raw key) noexcept { RegCloseKey(key); }
+};
+using SystemKey = Unique<KeyTraits>;
+
+constexpr size_t kMaxKeyNameUnits = 255;
+constexpr size_t kMaxValueNameUnits = 16383;
+
+HKEY rootKey(RegistryRoot root) noexcept {
+    switch (root) {
+        case RegistryRoot::currentUser:
+            return HKEY_CURRENT_USER;
+        case RegistryRoot::users:
+            return HKEY_USERS;
+        case RegistryRoot::classesRoot:
+            return HKEY_CLASSES_ROOT;
+        case RegistryRoot::localMachine:
+            break;
+    }
+    return HKEY_LOCAL_MACHINE;
+}
+
+// The system would read a name only up to a NUL in it, and so take one key for another.
+bool isName(WideView name) noexcept {
+    return name.find(VXWCHAR{0}) == WideView::npos;
+}
+
+// Names by index, `next(index, buffer, length)` filling a buffer of `maxUnits` and an end. A name that another process makes or
+// takes away meanwhile may be missed or seen twice, as with every walk of the system's registry.
+template <class Next>
+Status collectNames(size_t maxUnits, Next next, std::vector<WideString> &names) {
+    WideString buffer(maxUnits + 1, L'\0');
+    std::vector<WideString> found;
+    for (DWORD index = 0;; ++index) {
+        auto length = static_cast<DWORD>(buffer.size());
+        const LSTATUS status = next(index, buffer.data(), &length);
+        if (status == ERROR_NO_MORE_ITEMS) break;
+        if (status != ERROR_SUCCESS) return static_cast<Status>(status);
+        found.emplace_back(buffer.data(), length);
+    }
+    names = std::move(found);
+    return status::ok;
+}
+
+}  // namespace
+
+struct RegistryKey::Impl {
+    SystemKey key;
+
+    static Status open(HKEY above, WideView path, RegistryAccess access, RegistryKey &key) {
+        if (!isName(path)) return status::invalidParameter;
+        SystemKey opened;
+        const LSTATUS status = RegOpenKeyExW(above, WideString(path).c_str(), 0, static_cast<REGSAM>(access), opened.put());
+        return take(status, opened, key);
+    }
+
+    static Status create(HKEY above, WideView path, RegistryAccess access, RegistryKey &key, bool *created) {
+        if (!isName(path)) return status::invalidParameter;
+        SystemKey opened;
+        DWORD disposition = 0;
+        const LSTATUS status = RegCreateKeyExW(above, WideString(path).c_str(), 0, nullptr, REG_OPTION_NON_VOLATILE,
+                                               static_cast<REGSAM>(access), nullptr, opened.put(), &disposition);
+        if (status == ERROR_SUCCESS && created != nullptr) *created = disposition == REG_CREATED_NEW_KEY;
+        return take(status, opened, key);
+    }
+
+    static Status take(LSTATUS status, SystemKey &opened, RegistryKey &key) {
+        if (status != ERROR_SUCCESS) return static_cast<Status>(status);
+        auto impl = std::make_unique<Impl>();
+        impl->key = std::move(opened);
+        key.impl_ = std::move(impl);
+        return status::ok;
+    }
+};
+
+RegistryKey::RegistryKey() noexcept = default;
+RegistryKey::RegistryKey(RegistryKey &&) noexcept = default;
+RegistryKey &RegistryKey::operator=(RegistryKey &&) noexcept = default;
+RegistryKey::~RegistryKey() = default;
+
+Status RegistryKey::open(RegistryRoot root, WideView path, RegistryAccess access, RegistryKey &key) {
+    return Impl::open(rootKey(root), path, access, key);
+}
+
+Status RegistryKey::create(RegistryRoot root, WideView path, RegistryAccess access, RegistryKey &key, bool *created) {
+    return Impl::create(rootKey(root), path, access, key, created);
+}
+
+Status RegistryKey::openBelow(WideView path, RegistryAccess access, RegistryKey &key) const {
+    return impl_ ? Impl::open(impl_->key.get(), path, access, key) : status::invalidHandle;
+}
+
+Status RegistryKey::createBelow(WideView path, RegistryAccess access, RegistryKey &key, bool *created) const {
+    return impl_ ? Impl::create(impl_->key.get(), path, access, key, created) : status::invalidHandle;
+}
+
+RegistryKey::operator bool() const noexcept {
+    return impl_ != nullptr;
+}
+void RegistryKey::close() noexcept {
+    impl_.reset();
+}
+
+Status RegistryKey::query(WideView name, RegistryValue &value) const {
+    if (!impl_) return status::invalidHandle;
+    if (!isName(name)) return status::invalidParameter;
+    const WideString ended(name);
+    std::vector<uint8_t> data(256);
+    for (;;) {  // the size may change between two calls
+        DWORD type = 0;
+        auto size = static_cast<DWORD>(data.size());
+        const LSTATUS status = RegQueryValueExW(impl_->key.get(), ended.c_str(), nullptr, &type, data.data(), &size);
+        if (status != ERROR_SUCCESS && status != ERROR_MORE_DATA) return static_cast<Status>(status);
+        data.resize(size);
+        if (status == ERROR_MORE_DATA) continue;
+        value.type = static_cast<RegistryType>(type);
+        value.data = std::move(data);
+        return status::ok;
+    }
+}
+
+Status RegistryKey::set(WideView name, RegistryType type, std::span<const uint8_t> data) {
+    if (!impl_) return status::invalidHandle;
+    if (!isName(name)) return status::invalidParameter;
+    return static_cast<Status>(RegSetValueExW(impl_->key.get(), WideString(name).c_str(), 0, static_cast<DWORD>(type), data.data(),
+                                              static_cast<DWORD>(data.size())));
+}
+
+Status RegistryKey::deleteValue(WideView name) {
+    if (!impl_) return status::invalidHandle;
+    if (!isName(name)) return status::invalidParameter;
+    return static_cast<Status>(RegDeleteValueW(impl_->key.get(), WideString(name).c_str()));
+}
+
+Status RegistryKey::deleteBelow(WideView path) {
+    if (!impl_) return status::invalidHandle;
+    if (path.empty() || !isName(path)) return status::invalidParameter;
+    const LSTATUS status = RegDeleteKeyExW(impl_->key.get(), WideString(path).c_str(), KEY_WOW64_64KEY, 0);
+    return status == ERROR_KEY_HAS_CHILDREN ? status::accessDenied : static_cast<Status>(status);
+}
+
+Status RegistryKey::deleteTreeBelow(WideView path) {
+    if (!impl_) return status::invalidHandle;
+    if (!isName(path)) return status::invalidParameter;
+    return static_cast<Status>(RegDeleteTreeW(impl_->key.get(), path.empty() ? nullptr : WideString(path).c_str()));
+}
+
+Status RegistryKey::subkeys(std::vector<WideString> &names) const {
+    if (!impl_) return status::invalidHandle;
+    return collectNames(
+        kMaxKeyNameUnits,
+        [this](DWORD index, wchar_t *buffer, DWORD *length) {
+            return RegEnumKeyExW(impl_->key.get(), index, buffer, length, nullptr, nullptr, nullptr, nullptr);
+        },
+        names);
+}
+
+Status RegistryKey::values(std::vector<WideString> &names) const {
+    if (!impl_) return status::invalidHandle;
+    return collectNames(
+        kMaxValueNameUnits,
+        [this](DWORD index, wchar_t *buffer, DWORD *length) {
+            return RegEnumValueW(impl_->key.get(), index, buffer, length, nullptr, nullptr, nullptr, nullptr);
+        },
+        names);
+}
+
+}  // namespace vxcomn
