@@ -129,6 +129,29 @@ VXCOMN_API uint32_t VXDSPAPI_SetParameter(VXHandle handle, int32_t componentId, 
 VXCOMN_API uint32_t VXDSPAPI_SetParameterEx(VXHandle handle, int32_t componentId, int32_t paramId, uint32_t channel, uint8_t *data,
                                             uint32_t dataSize, int32_t transient);
 
+/*
+ * Turns a power spectrum of the caller's into fractional-octave bands. Needs no handle.
+ * power: fftSize / 2 + 1 linear values, from 0 Hz to half of sampleRate (Hz). bandsPerOctave: 3, 6, 12, 24, 48, or -24 for 24 bands
+ * shifted by a quarter octave; any other number means 1. integrate: nonzero for the power between a band's edges, 0 for the value at
+ * its centre. bands: room for one value less than the result; 555 are enough for every table.
+ * Returns the number of band edges, one more than the values written.
+ * A band above half of sampleRate is 0. With fftSize below 2 or sampleRate below 1 nothing is written.
+ * [any] One caller for each `bands`.
+ */
+VXCOMN_API int32_t VXDSPAPI_RTA_CalcSpectrum(const float *power, int32_t fftSize, float *bands, int32_t sampleRate,
+                                             int32_t bandsPerOctave, int32_t integrate);
+
+/*
+ * The same over a table of the caller's.
+ * power: halfSize + 1 values. edges: tableSize frequencies in Hz, rising; centres: one less, each between its two edges. bands: room
+ * for tableSize - 1 values.
+ * No result.
+ * A band whose frequencies are below 0 or no number keeps what its slot holds; so do all with halfSize or sampleRate below 1.
+ * [any] One caller for each `bands`.
+ */
+VXCOMN_API void VXDSPAPI_RTA_FFTToBands(const float *power, int32_t halfSize, const float *edges, const float *centres,
+                                        int32_t tableSize, float *bands, int32_t sampleRate, int32_t integrate);
+
 VXCOMN_EXTERN_C_END
 
 #endif

@@ -1,0 +1,36 @@
+// SPDX-License-Identifier: MIT
+//
+// The inner loops of this room that come in one version for each instruction set: kernels_sse2.cpp, kernels_avx2.cpp and
+// kernels_avx512.cpp hold the same functions, and one of the three tables is chosen while the library loads. All give the same
+// bits.
+//
+// A kernel file includes intrinsics and headers whose functions are all inlined or local to the file: a function that the linker
+// may share between files would carry the wider instruction set into code that runs everywhere.
+#pragma once
+
+#include <cstdint>
+
+#include "measure/instruction_set.h"
+
+namespace vxcomn {
+
+struct MeasureKernels {
+    // Raises each channel's peak to the largest magnitude of its samples; NaN never raises.
+    void (*peaks)(float *const *channels, float *peaks, int channelCount, int frameCount);
+    // Whether a magnitude lies above the threshold. NaN never does.
+    bool (*anyAbove)(const float *samples, int count, float threshold);
+    // mean[i] = (channels[0][from + i] + channels[1][from + i] + ...) / channelCount. At least two channels.
+    void (*mean)(float *const *channels, int channelCount, int from, int count, float *mean);
+    // to[i] = from[i]; the two don't overlap.
+    void (*copy)(const float *from, int count, float *to);
+};
+
+// The table in use. Written while the library loads and by tests, when no block runs; read by everybody.
+extern const MeasureKernels *measureKernels;
+
+extern const MeasureKernels kMeasureKernelsSse2, kMeasureKernelsAvx2, kMeasureKernelsAvx512;
+
+// Takes another instruction set's table. For tests: the machine must have that set.
+void selectMeasureKernels(InstructionSet set) noexcept;
+
+}  // namespace vxcomn

@@ -1,0 +1,50 @@
+// SPDX-License-Identifier: MIT
+//
+// The kernels for machines with AVX2. See measure/kernels.h.
+#include "measure/kernels.h"
+
+#include <immintrin.h>
+
+#include "measure/level_lanes.h"
+
+namespace vxcomn {
+namespace {
+
+struct Level {
+    using Floats = __m256;
+    static constexpr int kWidth = 8;
+    VXCOMN_RT_INLINE static Floats load(const float *from) { return _mm256_loadu_ps(from); }
+    VXCOMN_RT_INLINE static void store(float *to, Floats value) { _mm256_storeu_ps(to, value); }
+    VXCOMN_RT_INLINE static Floats broadcast(float value) { return _mm256_set1_ps(value); }
+    // The second one where the first is NaN, as `a > b ? a : b` has it.
+    VXCOMN_RT_INLINE static Floats larger(Floats a, Floats b) { return _mm256_max_ps(a, b); }
+    VXCOMN_RT_INLINE static Floats magnitude(Floats value) { return _mm256_andnot_ps(_mm256_set1_ps(-0.0F), value); }
+    VXCOMN_RT_INLINE static bool anyLarger(Floats a, Floats b) { return _mm256_movemask_ps(_mm256_cmp_ps(a, b, _CMP_GT_OQ)) != 0; }
+    VXCOMN_RT_INLINE static float highest(Floats value) {
+        __m128 half = _mm_max_ps(_mm256_castps256_ps128(value), _mm256_extractf128_ps(value, 1));
+        half = _mm_max_ps(half, _mm_movehl_ps(half, half));
+        return _mm_cvtss_f32(_mm_max_ss(half, _mm_shuffle_ps(half, half, 1)));
+    }
+};
+
+VXCOMN_RT void peaks(float *const *channels, float *peaks, int channelCount, int frameCount) {
+    peaksInLanes<Level>(channels, peaks, channelCount, frameCount);
+}
+
+VXCOMN_RT bool anyAbove(const float *samples, int count, float threshold) {
+    return anyAboveInLanes<Level>(samples, count, threshold);
+}
+
+VXCOMN_RT void mean(float *const *channels, int channelCount, int from, int count, float *to) {
+    meanInLanes<Level>(channels, channelCount, from, count, to);
+}
+
+VXCOMN_RT void copy(const float *from, int count, float *to) {
+    copyInLanes<Level>(from, count, to);
+}
+
+}  // namespace
+
+constinit const MeasureKernels kMeasureKernelsAvx2 = {peaks, anyAbove, mean, copy};
+
+}  // namespace vxcomn

@@ -1,0 +1,49 @@
+// SPDX-License-Identifier: MIT
+//
+// The kernels for machines with AVX-512 (F, BW, DQ, VL). See measure/kernels.h.
+#include "measure/kernels.h"
+
+// g++ 12 takes the undefined pass-through of its own 512-bit intrinsics for a variable that was forgotten.
+#pragma GCC diagnostic ignored "-Wmaybe-uninitialized"
+
+#include <immintrin.h>
+
+#include "measure/level_lanes.h"
+
+namespace vxcomn {
+namespace {
+
+struct Level {
+    using Floats = __m512;
+    static constexpr int kWidth = 16;
+    VXCOMN_RT_INLINE static Floats load(const float *from) { return _mm512_loadu_ps(from); }
+    VXCOMN_RT_INLINE static void store(float *to, Floats value) { _mm512_storeu_ps(to, value); }
+    VXCOMN_RT_INLINE static Floats broadcast(float value) { return _mm512_set1_ps(value); }
+    // The second one where the first is NaN, as `a > b ? a : b` has it.
+    VXCOMN_RT_INLINE static Floats larger(Floats a, Floats b) { return _mm512_max_ps(a, b); }
+    VXCOMN_RT_INLINE static Floats magnitude(Floats value) { return _mm512_abs_ps(value); }
+    VXCOMN_RT_INLINE static bool anyLarger(Floats a, Floats b) { return _mm512_cmp_ps_mask(a, b, _CMP_GT_OQ) != 0; }
+    VXCOMN_RT_INLINE static float highest(Floats value) { return _mm512_reduce_max_ps(value); }
+};
+
+VXCOMN_RT void peaks(float *const *channels, float *peaks, int channelCount, int frameCount) {
+    peaksInLanes<Level>(channels, peaks, channelCount, frameCount);
+}
+
+VXCOMN_RT bool anyAbove(const float *samples, int count, float threshold) {
+    return anyAboveInLanes<Level>(samples, count, threshold);
+}
+
+VXCOMN_RT void mean(float *const *channels, int channelCount, int from, int count, float *to) {
+    meanInLanes<Level>(channels, channelCount, from, count, to);
+}
+
+VXCOMN_RT void copy(const float *from, int count, float *to) {
+    copyInLanes<Level>(from, count, to);
+}
+
+}  // namespace
+
+constinit const MeasureKernels kMeasureKernelsAvx512 = {peaks, anyAbove, mean, copy};
+
+}  // namespace vxcomn

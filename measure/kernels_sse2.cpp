@@ -1,0 +1,49 @@
+// SPDX-License-Identifier: MIT
+//
+// The kernels for every x86-64 machine: SSE2. See measure/kernels.h.
+#include "measure/kernels.h"
+
+#include <immintrin.h>
+
+#include "measure/level_lanes.h"
+
+namespace vxcomn {
+namespace {
+
+struct Level {
+    using Floats = __m128;
+    static constexpr int kWidth = 4;
+    VXCOMN_RT_INLINE static Floats load(const float *from) { return _mm_loadu_ps(from); }
+    VXCOMN_RT_INLINE static void store(float *to, Floats value) { _mm_storeu_ps(to, value); }
+    VXCOMN_RT_INLINE static Floats broadcast(float value) { return _mm_set1_ps(value); }
+    // The second one where the first is NaN, as `a > b ? a : b` has it.
+    VXCOMN_RT_INLINE static Floats larger(Floats a, Floats b) { return _mm_max_ps(a, b); }
+    VXCOMN_RT_INLINE static Floats magnitude(Floats value) { return _mm_andnot_ps(_mm_set1_ps(-0.0F), value); }
+    VXCOMN_RT_INLINE static bool anyLarger(Floats a, Floats b) { return _mm_movemask_ps(_mm_cmpgt_ps(a, b)) != 0; }
+    VXCOMN_RT_INLINE static float highest(Floats value) {
+        value = larger(value, _mm_movehl_ps(value, value));
+        return _mm_cvtss_f32(_mm_max_ss(value, _mm_shuffle_ps(value, value, 1)));
+    }
+};
+
+VXCOMN_RT void peaks(float *const *channels, float *peaks, int channelCount, int frameCount) {
+    peaksInLanes<Level>(channels, peaks, channelCount, frameCount);
+}
+
+VXCOMN_RT bool anyAbove(const float *samples, int count, float threshold) {
+    return anyAboveInLanes<Level>(samples, count, threshold);
+}
+
+VXCOMN_RT void mean(float *const *channels, int channelCount, int from, int count, float *to) {
+    meanInLanes<Level>(channels, channelCount, from, count, to);
+}
+
+VXCOMN_RT void copy(const float *from, int count, float *to) {
+    copyInLanes<Level>(from, count, to);
+}
+
+}  // namespace
+
+constinit const MeasureKernels kMeasureKernelsSse2 = {peaks, anyAbove, mean, copy};
+
+}  // namespace vxcomn
