@@ -8,6 +8,13 @@ add_compile_options(
     $<$<COMPILE_LANGUAGE:CXX>:-Wno-invalid-offsetof>
     -ffp-contract=off -fno-tree-slp-vectorize)
 
+if(CMAKE_CXX_COMPILER_ID STREQUAL "GNU")
+    # The block path may call nothing outside its section, so no loop may turn into a call of memset or memcpy.
+    add_compile_options(-fno-tree-loop-distribute-patterns)
+    # Two warnings that g++ 12 raises for its own library's strings and vectors, without cause.
+    add_compile_options($<$<COMPILE_LANGUAGE:CXX>:-Wno-restrict> $<$<COMPILE_LANGUAGE:CXX>:-Wno-stringop-overflow>)
+endif()
+
 if(WIN32)
     # UNICODE only tells the SDK headers which names to take. g++ does not align the stack to more than 16 bytes on this system, so
     # the assembler makes the spills of wide registers unaligned moves.
@@ -28,8 +35,9 @@ function(vxcomn_set_instruction_sets)
         if(source MATCHES "_avx2\\.cpp$")
             set_source_files_properties(${source} PROPERTIES COMPILE_OPTIONS "-mavx2")
         elseif(source MATCHES "_avx512\\.cpp$")
+            # g++ 12 takes its own intrinsics' undefined lanes for uninitialised variables.
             set_source_files_properties(${source} PROPERTIES
-                COMPILE_OPTIONS "-mavx2;-mavx512f;-mavx512bw;-mavx512dq;-mavx512vl;-mprefer-vector-width=512")
+                COMPILE_OPTIONS "-Wno-uninitialized;$<$<CXX_COMPILER_ID:GNU>:-Wno-maybe-uninitialized>;-mavx2;-mavx512f;-mavx512bw;-mavx512dq;-mavx512vl;-mprefer-vector-width=512")
         endif()
     endforeach()
 endfunction()

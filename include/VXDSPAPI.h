@@ -25,11 +25,13 @@ typedef VXEngineHandle VXHandle;
 
 /*
  * Loads an engine module and makes an instance of it.
- * EngineName: the module's file name without its ending. PlatformName: null or "Float" for f32 engines, "HiFi2", "iSST" or "AIC326x"
- * for engines on 24-bit words; exact, with case. Hardware: flags, handed to the engine. CommandLine: handed to the engine;
- * "/wrpresetbinoff", "/wrboardparamsoff", "iepid:ID" and "oepid:ID" are the host's. APOPresetPath: null, or a preset to maintain: such
- * an instance never runs the engine's audio path. RecordSampleRate: Hz, of the capture side. HostType: 1 to 4, or anything else.
- * The module's file is EngineName.dll with a null platform name or host type 3, else EngineName.DSP.dll, EngineName.DSP.HiFi2.dll
+ * EngineName: the module's file name without its ending. PlatformName: null or "Float" for f32 engines, "HiFi2", "iSST" or
+ * "AIC326x" for engines on 24-bit words; exact, with case. Hardware: flags, handed to the engine. CommandLine: handed to the
+ * engine;
+ * "/wrpresetbinoff", "/wrboardparamsoff", "iepid:ID" and "oepid:ID" are the host's. APOPresetPath: null, or a preset to maintain:
+ * such an instance never runs the engine's audio path. RecordSampleRate: Hz, of the capture side. HostType: 1 to 4, or anything
+ * else. The module's file is EngineName.dll with a null platform name or host type 3, else EngineName.DSP.dll,
+ * EngineName.DSP.HiFi2.dll
  * ("HiFi2", "iSST") or EngineName.DSP.AIC326x.dll. It is looked for as the system does, then beside this library.
  * Returns the handle, or null: no such module, no VXDSPAPI_Initialize in it, an unknown platform name, or an engine that declines.
  * An engine that declines keeps its module loaded.
@@ -132,22 +134,19 @@ VXCOMN_API uint32_t VXDSPAPI_SetParameterEx(VXHandle handle, int32_t componentId
 /*
  * Turns a power spectrum of the caller's into fractional-octave bands. Needs no handle.
  * power: fftSize / 2 + 1 linear values, from 0 Hz to half of sampleRate (Hz). bandsPerOctave: 3, 6, 12, 24, 48, or -24 for 24 bands
- * shifted by a quarter octave; any other number means 1. integrate: nonzero for the power between a band's edges, 0 for the value at
- * its centre. bands: room for one value less than the result; 555 are enough for every table.
- * Returns the number of band edges, one more than the values written.
- * A band above half of sampleRate is 0. With fftSize below 2 or sampleRate below 1 nothing is written.
- * [any] One caller for each `bands`.
+ * shifted by a quarter octave; any other number means 1. integrate: nonzero for the power between a band's edges, 0 for the value
+ * at its centre. bands: room for one value less than the result; 555 are enough for every table. Returns the number of band edges,
+ * one more than the values written. A band above half of sampleRate is 0. With fftSize below 2 or sampleRate below 1 nothing is
+ * written. [any] One caller for each `bands`.
  */
 VXCOMN_API int32_t VXDSPAPI_RTA_CalcSpectrum(const float *power, int32_t fftSize, float *bands, int32_t sampleRate,
                                              int32_t bandsPerOctave, int32_t integrate);
 
 /*
  * The same over a table of the caller's.
- * power: halfSize + 1 values. edges: tableSize frequencies in Hz, rising; centres: one less, each between its two edges. bands: room
- * for tableSize - 1 values.
- * No result.
- * A band whose frequencies are below 0 or no number keeps what its slot holds; so do all with halfSize or sampleRate below 1.
- * [any] One caller for each `bands`.
+ * power: halfSize + 1 values. edges: tableSize frequencies in Hz, rising; centres: one less, each between its two edges. bands:
+ * room for tableSize - 1 values. No result. A band whose frequencies are below 0 or no number keeps what its slot holds; so do all
+ * with halfSize or sampleRate below 1. [any] One caller for each `bands`.
  */
 VXCOMN_API void VXDSPAPI_RTA_FFTToBands(const float *power, int32_t halfSize, const float *edges, const float *centres,
                                         int32_t tableSize, float *bands, int32_t sampleRate, int32_t integrate);

@@ -8,8 +8,8 @@ namespace vxcomn {
 
 InstructionSet bestInstructionSet() noexcept {
     __builtin_cpu_init();
-    if (__builtin_cpu_supports("avx512f") != 0 && __builtin_cpu_supports("avx512bw") != 0 && __builtin_cpu_supports("avx512dq") != 0 &&
-        __builtin_cpu_supports("avx512vl") != 0) {
+    if (__builtin_cpu_supports("avx512f") != 0 && __builtin_cpu_supports("avx512bw") != 0 &&
+        __builtin_cpu_supports("avx512dq") != 0 && __builtin_cpu_supports("avx512vl") != 0) {
         return InstructionSet::avx512;
     }
     return __builtin_cpu_supports("avx2") != 0 ? InstructionSet::avx2 : InstructionSet::sse2;

@@ -9,8 +9,8 @@
 #include "types.h"
 
 enum {
-    VX_SLOT_COUNT = 8,   /* buffers of a block, one a speaker position */
-    VX_MAX_FRAMES = 512  /* the longest block that is processed */
+    VX_SLOT_COUNT = 8,  /* buffers of a block, one a speaker position */
+    VX_MAX_FRAMES = 512 /* the longest block that is processed */
 };
 
 /* Slots: the fixed positions of the eight channel buffers. */
@@ -49,15 +49,16 @@ typedef struct IOFormat {
 
 /* The buffers of a block. 24 bytes. */
 typedef struct ProcessBuffers {
-    float **channels;     /* eight pointers, all valid whatever the format, to buffers of at least 512 samples; processed in place */
-    uint64_t reserved;    /* the caller's; travels to the engine */
-    int32_t silent;       /* written by VXDSPAPI_Process: 1 after more than one second of silence, else 0 */
-    uint32_t reserved2;   /* the caller's; travels to the engine */
+    float **channels;   /* eight pointers, all valid whatever the format, to buffers of at least 512 samples; processed in place */
+    uint64_t reserved;  /* the caller's; travels to the engine */
+    int32_t silent;     /* written by VXDSPAPI_Process: 1 after more than one second of silence, else 0 */
+    uint32_t reserved2; /* the caller's; travels to the engine */
 } ProcessBuffers;
 
 #ifdef __cplusplus
 static_assert(sizeof(IOFormat) == 32 && offsetof(IOFormat, channelMask) == 4 && offsetof(IOFormat, frames) == 8 &&
-                  offsetof(IOFormat, sampleRate) == 12 && offsetof(IOFormat, channelSlot) == 16 && offsetof(IOFormat, slotSpeaker) == 24,
+                  offsetof(IOFormat, sampleRate) == 12 && offsetof(IOFormat, channelSlot) == 16 &&
+                  offsetof(IOFormat, slotSpeaker) == 24,
               "IOFormat crosses the interface");
 static_assert(sizeof(ProcessBuffers) == 24 && offsetof(ProcessBuffers, reserved) == 8 && offsetof(ProcessBuffers, silent) == 16 &&
                   offsetof(ProcessBuffers, reserved2) == 20,

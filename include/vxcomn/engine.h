@@ -61,12 +61,13 @@ typedef void (*VXEngineDisposeComponent)(VXEngineHandle handle, uint32_t compone
 /* [control] Clears histories. */
 typedef void (*VXEngineClear)(VXEngineHandle handle, uint32_t what);
 /* [control] `data` is a little-endian byte string of `dataSize` bytes. May come during a block. */
-typedef uint32_t (*VXEngineSetParameter)(VXEngineHandle handle, int32_t componentId, int32_t paramId, uint32_t channel, uint8_t *data,
-                                         uint32_t dataSize);
+typedef uint32_t (*VXEngineSetParameter)(VXEngineHandle handle, int32_t componentId, int32_t paramId, uint32_t channel,
+                                         uint8_t *data, uint32_t dataSize);
 /* [control] The engine's own data; packed little-endian streams. Returns the bytes written to `output`. */
 typedef uint32_t (*VXEngineReadWriteData)(VXEngineHandle handle, uint32_t componentId, int32_t paramId, const uint8_t *input,
                                           int32_t inputSize, uint8_t *output);
-/* [render] Processes one block in place: f32 samples, or 24-bit samples left-justified in 32-bit words on a fixed-point platform. */
+/* [render] Processes one block in place: f32 samples, or 24-bit samples left-justified in 32-bit words on a fixed-point platform.
+ */
 typedef void (*VXEngineProcess)(VXEngineHandle handle, ProcessBuffers *buffers, IOFormat *input, IOFormat *output);
 /* [capture] Sees one block of the capture side. */
 typedef void (*VXEngineRecord)(VXEngineHandle handle, ProcessBuffers *buffers, IOFormat *format);
@@ -75,7 +76,8 @@ typedef void (*VXEngineOnIdle)(VXEngineHandle handle);
 
 #ifdef __cplusplus
 static_assert(sizeof(EngineComponent) == 8, "EngineComponent crosses the interface");
-static_assert(sizeof(EngineConfig) == 524 && offsetof(EngineConfig, ComponentCount) == 8 && offsetof(EngineConfig, Components) == 12,
+static_assert(sizeof(EngineConfig) == 524 && offsetof(EngineConfig, ComponentCount) == 8 &&
+                  offsetof(EngineConfig, Components) == 12,
               "EngineConfig crosses the interface");
 #endif
 

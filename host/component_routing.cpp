@@ -1,0 +1,63 @@
+// SPDX-License-Identifier: MIT
+#include "host/component_routing.h"
+
+#include <algorithm>
+
+#include "host/host_context.h"
+
+namespace vxcomn {
+
+namespace {
+
+// Parameter ids that the host sends to engines.
+constexpr int32_t kComponentEnable = -6;
+constexpr int32_t kDisableInputGain = -29;
+constexpr int32_t kDisableOutputGain = -30;
+constexpr int32_t kGlobalComponent = -1;
+
+void send(VXEngineSetParameter setParameter, VXEngineHandle handle, int32_t componentId, int32_t paramId, bool on) {
+    uint8_t data = on ? 1 : 0;
+    if (setParameter != nullptr) setParameter(handle, componentId, paramId, 0, &data, 1);
+}
+
+// Whether some enabled component still runs in the main engine.
+bool mainEngineHasWork(const LibraryContext &context) {
+    const int last = std::min<int>(context.maxComponentId, VX_MAX_COMPONENTS - 1);
+    for (int id = 0; id <= last; ++id) {
+        if (context.componentEnable[id] != 0 && context.componentOnISST[id] == 0) return true;
+    }
+    return false;
+}
+
+}  // namespace
+
+void UpdateComponentEnable(VXEngineHandle handle, int32_t componentId) {
+    const LibraryContext &context = contextOf(handle);
+    const bool enable = context.componentEnable[componentId] != 0;
+    const bool onISST = context.componentOnISST[componentId] != 0;
+    hostLog(context, VX_TEXT("ISSTModuleLoaded = %i, enable = %i.\n"), context.isstLoaded, enable);
+    if (context.isstLoaded == 0) {
+        send(context.engineSetParameter, handle, componentId, kComponentEnable, enable);
+        return;
+    }
+    send(context.engineSetParameter, handle, componentId, kComponentEnable, enable && !onISST);
+    send(context.isstModule->engineSetParameter, context.isstHandle, componentId, kComponentEnable, enable && onISST);
+}
+
+void UpdateDisableInputOutputGains(VXEngineHandle handle) {
+    const LibraryContext &context = contextOf(handle);
+    hostLog(context, VX_TEXT("ISSTModuleLoaded = %i.\n"), context.isstLoaded);
+    if (context.isstLoaded == 0) {
+        send(context.engineSetParameter, handle, kGlobalComponent, kDisableInputGain, false);
+        send(context.engineSetParameter, handle, kGlobalComponent, kDisableOutputGain, false);
+        return;
+    }
+    const bool hybridProcMode = mainEngineHasWork(context);
+    hostLog(context, VX_TEXT("hybridProcMode = %i.\n"), hybridProcMode);
+    // Kept: the module is never told about its output gain.
+    send(context.engineSetParameter, handle, kGlobalComponent, kDisableInputGain, !hybridProcMode);
+    send(context.engineSetParameter, handle, kGlobalComponent, kDisableOutputGain, true);
+    send(context.isstModule->engineSetParameter, context.isstHandle, kGlobalComponent, kDisableInputGain, hybridProcMode);
+}
+
+}  // namespace vxcomn
