@@ -19,7 +19,6 @@ if(WIN32)
     # UNICODE only tells the SDK headers which names to take. g++ does not align the stack to more than 16 bytes on this system, so
     # the assembler makes the spills of wide registers unaligned moves.
     add_compile_definitions(UNICODE _UNICODE WIN32_LEAN_AND_MEAN NOMINMAX _WIN32_WINNT=0x0A00)
-    add_compile_options(-fstack-protector-strong)
     add_compile_options($<$<COMPILE_LANGUAGE:CXX>:-Wa,-muse-unaligned-vector-move>)
     add_link_options(-static)
 endif()
