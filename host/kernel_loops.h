@@ -64,13 +64,14 @@ VXCOMN_RT_INLINE void fold(float *const *channels, const FoldPlan &plan, int fra
 
 template <class V, int kShift>
 VXCOMN_RT_INLINE void toWord(const float *samples, int32_t *words) noexcept {
-    const auto scaled = V::truncate(V::multiply(V::load(samples), V::broadcast(8388608.0F)));
-    V::storeWords(words, V::template shiftLeft<kShift>(V::clamp(scaled, -8388608, 8388607)));
+    const auto scaled = V::multiply(V::load(samples), V::broadcast(8388608.0F));
+    V::storeWords(words, V::template shiftLeft<kShift>(V::to24Bits(scaled)));
 }
 
 template <class V, class One, int kShift>
 VXCOMN_RT_INLINE void toWords(const float *samples, int32_t *words, int count) noexcept {
     int t = 0;
+#pragma GCC unroll 4
     for (; t + V::lanes <= count; t += V::lanes) toWord<V, kShift>(samples + t, words + t);
     for (; t < count; ++t) toWord<One, kShift>(samples + t, words + t);
 }
@@ -84,6 +85,7 @@ VXCOMN_RT_INLINE void fromWord(const int32_t *words, float *samples) noexcept {
 template <class V, class One>
 VXCOMN_RT_INLINE void fromWords(const int32_t *words, float *samples, int count) noexcept {
     int t = 0;
+#pragma GCC unroll 4
     for (; t + V::lanes <= count; t += V::lanes) fromWord<V>(words + t, samples + t);
     for (; t < count; ++t) fromWord<One>(words + t, samples + t);
 }

@@ -19,9 +19,9 @@ struct OneLane {
     VXCOMN_RT_INLINE static __m128 broadcast(float a) noexcept { return _mm_set_ss(a); }
     VXCOMN_RT_INLINE static __m128 add(__m128 a, __m128 b) noexcept { return _mm_add_ss(a, b); }
     VXCOMN_RT_INLINE static __m128 multiply(__m128 a, __m128 b) noexcept { return _mm_mul_ss(a, b); }
-    VXCOMN_RT_INLINE static int32_t truncate(__m128 a) noexcept { return _mm_cvttss_si32(a); }
-    VXCOMN_RT_INLINE static int32_t clamp(int32_t a, int32_t low, int32_t high) noexcept {
-        return a < low ? low : a > high ? high : a;
+    VXCOMN_RT_INLINE static int32_t to24Bits(__m128 a) noexcept {
+        const int32_t v = _mm_cvttss_si32(a);
+        return v < -8388608 ? -8388608 : v > 8388607 ? 8388607 : v;
     }
     template <int kBits>
     VXCOMN_RT_INLINE static int32_t shiftLeft(int32_t a) noexcept {

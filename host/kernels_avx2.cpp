@@ -16,9 +16,9 @@ struct EightLanes {
     VXCOMN_RT_INLINE static __m256 broadcast(float a) noexcept { return _mm256_set1_ps(a); }
     VXCOMN_RT_INLINE static __m256 add(__m256 a, __m256 b) noexcept { return _mm256_add_ps(a, b); }
     VXCOMN_RT_INLINE static __m256 multiply(__m256 a, __m256 b) noexcept { return _mm256_mul_ps(a, b); }
-    VXCOMN_RT_INLINE static __m256i truncate(__m256 a) noexcept { return _mm256_cvttps_epi32(a); }
-    VXCOMN_RT_INLINE static __m256i clamp(__m256i a, int32_t low, int32_t high) noexcept {
-        return _mm256_min_epi32(_mm256_max_epi32(a, _mm256_set1_epi32(low)), _mm256_set1_epi32(high));
+    VXCOMN_RT_INLINE static __m256i to24Bits(__m256 a) noexcept {
+        const __m256i v = _mm256_cvttps_epi32(a);
+        return _mm256_min_epi32(_mm256_max_epi32(v, _mm256_set1_epi32(-8388608)), _mm256_set1_epi32(8388607));
     }
     template <int kBits>
     VXCOMN_RT_INLINE static __m256i shiftLeft(__m256i a) noexcept {

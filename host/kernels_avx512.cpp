@@ -16,9 +16,9 @@ struct SixteenLanes {
     VXCOMN_RT_INLINE static __m512 broadcast(float a) noexcept { return _mm512_set1_ps(a); }
     VXCOMN_RT_INLINE static __m512 add(__m512 a, __m512 b) noexcept { return _mm512_add_ps(a, b); }
     VXCOMN_RT_INLINE static __m512 multiply(__m512 a, __m512 b) noexcept { return _mm512_mul_ps(a, b); }
-    VXCOMN_RT_INLINE static __m512i truncate(__m512 a) noexcept { return _mm512_cvttps_epi32(a); }
-    VXCOMN_RT_INLINE static __m512i clamp(__m512i a, int32_t low, int32_t high) noexcept {
-        return _mm512_min_epi32(_mm512_max_epi32(a, _mm512_set1_epi32(low)), _mm512_set1_epi32(high));
+    VXCOMN_RT_INLINE static __m512i to24Bits(__m512 a) noexcept {
+        const __m512i v = _mm512_cvttps_epi32(a);
+        return _mm512_min_epi32(_mm512_max_epi32(v, _mm512_set1_epi32(-8388608)), _mm512_set1_epi32(8388607));
     }
     template <int kBits>
     VXCOMN_RT_INLINE static __m512i shiftLeft(__m512i a) noexcept {

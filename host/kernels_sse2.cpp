@@ -16,15 +16,12 @@ struct FourLanes {
     VXCOMN_RT_INLINE static __m128 broadcast(float a) noexcept { return _mm_set1_ps(a); }
     VXCOMN_RT_INLINE static __m128 add(__m128 a, __m128 b) noexcept { return _mm_add_ps(a, b); }
     VXCOMN_RT_INLINE static __m128 multiply(__m128 a, __m128 b) noexcept { return _mm_mul_ps(a, b); }
-    VXCOMN_RT_INLINE static __m128i truncate(__m128 a) noexcept { return _mm_cvttps_epi32(a); }
-    VXCOMN_RT_INLINE static __m128i choose(__m128i condition, __m128i a, __m128i b) noexcept {
-        return _mm_or_si128(_mm_and_si128(condition, a), _mm_andnot_si128(condition, b));
-    }
-    VXCOMN_RT_INLINE static __m128i clamp(__m128i a, int32_t low, int32_t high) noexcept {
-        const __m128i lowest = _mm_set1_epi32(low);
-        const __m128i highest = _mm_set1_epi32(high);
-        a = choose(_mm_cmpgt_epi32(lowest, a), lowest, a);
-        return choose(_mm_cmpgt_epi32(a, highest), highest, a);
+    // SSE2 has no minimum of 32-bit integers, so the range is held ahead of the conversion, where a NaN takes the lower bound. What
+    // no 32-bit integer holds has to become the lowest sample: the complement of the highest, which it was held to, is just that.
+    VXCOMN_RT_INLINE static __m128i to24Bits(__m128 a) noexcept {
+        const __m128 beyond = _mm_cmpge_ps(a, _mm_set1_ps(2147483648.0F));
+        const __m128 held = _mm_min_ps(_mm_max_ps(a, _mm_set1_ps(-8388608.0F)), _mm_set1_ps(8388607.0F));
+        return _mm_xor_si128(_mm_cvttps_epi32(held), _mm_castps_si128(beyond));
     }
     template <int kBits>
     VXCOMN_RT_INLINE static __m128i shiftLeft(__m128i a) noexcept {
