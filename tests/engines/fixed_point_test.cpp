@@ -41,7 +41,7 @@ TEST_CASE("the fixed-point build equals the float build within one step of 24 bi
     setEverything(judge);
     const Stream expected = judge.run(in);
     for (const char *name : {"SampleEngine.DSP.HiFi2", "SampleEngine.DSP.AIC326x", "Tarnlight.Orlo.DSP.HiFi2", "VXORHF64U"}) {
-        CAPTURE(name);
+        CAPTURE(std::string(name));
         EngineRig rig(name);
         rig.setFormat(kSevenOne, 48000);
         setEverything(rig);

@@ -27,7 +27,7 @@ void rememberEvent(LibraryContext *context, int32_t, int32_t, const char *text) 
 TEST_CASE("every file name exports all fourteen functions and starts") {
     for (const char *name : {"SampleEngine", "SampleEngine.DSP", "SampleEngine.DSP.HiFi2", "SampleEngine.DSP.AIC326x",
                              "Tarnlight.Orlo.DSP.HiFi2", "VXORHF64U"}) {
-        CAPTURE(name);
+        CAPTURE(std::string(name));
         EngineRig rig(name);
         REQUIRE(rig.handle() != nullptr);
         CHECK(rig.setFormat(kStereo, 48000) == 0);

@@ -44,7 +44,7 @@ double largestJump(const Stream &stream) {
 TEST_CASE("no parameter clicks when it is stepped during play") {
     // A full-scale sine of 200 Hz moves by at most 0.026 a frame at 48 kHz; a click is many times as large.
     for (const Step &step : kSteps) {
-        CAPTURE(step.what);
+        CAPTURE(std::string(step.what));
         EngineRig rig;
         rig.setFormat(kStereo, 48000);
         rig.setBass(0.5F);
