@@ -61,6 +61,18 @@ TEST_CASE("the limiter keeps the balance of the channels") {
     CHECK(std::fabs(amplitudeAt(out[1], 500.0, 48000.0) / amplitudeAt(out[0], 500.0, 48000.0) - 0.25) < 0.001);
 }
 
+TEST_CASE("component 4 stands ahead of the equaliser, as its position says, and can be switched off") {
+    EngineRig rig;
+    rig.setFormat(kStereo, 48000);
+    rig.setInputGain(4.0F);
+    rig.setBand(6, 1, 1000.0F, 1.44F, -18.0F);
+    const Stream in = sine(96000, 1000.0, 48000.0, 1.0);
+    const double cut = std::pow(10.0, -18.0 / 20.0);
+    CHECK(std::fabs(amplitudeAt(rig.run(in)[0], 1000.0, 48000.0) - cut) < 0.005);
+    rig.setSwitch(4, -6, false);
+    CHECK(std::fabs(amplitudeAt(rig.run(in)[0], 1000.0, 48000.0) - 4.0 * cut) < 0.005);
+}
+
 TEST_CASE("a limited sine stays a sine: the fundamental holds nearly all of its power") {
     EngineRig rig;
     rig.setFormat(kStereo, 48000);
