@@ -28,8 +28,7 @@ bool Engine::setFormat(const IOFormat &input, const IOFormat &output) {
     block_.pairs = plan_.pairs;
     for (int pair = 0; pair < plan_.pairs; ++pair) {
         const int slot = plan_.pairSlot[pair];
-        const bool leftAndRight = slot != VX_SLOT_FRONT_CENTER && plan_.processed[slot] && plan_.processed[slot + 1];
-        surround_.tap().widen[pair] = both(leftAndRight ? 1.0 : 0.0);
+        surround_.tap().leftAndRight[pair] = slot != VX_SLOT_FRONT_CENTER && plan_.processed[slot] && plan_.processed[slot + 1];
     }
     publish();
     clear();

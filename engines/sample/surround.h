@@ -19,11 +19,12 @@ inline FilterShape designSurround(double gain, double sampleRate) {
 // Filters the side signal and adds what the filter changed. The two lanes hold the side and its negative: the arithmetic is the
 // same for both but for the sign.
 struct SideTap {
-    Pair widen[kMaxPairs] = {};  // 1 for a pair of left and right, 0 for others
+    bool leftAndRight[kMaxPairs] = {};  // which pairs have a side
 
     Pair operator()(Pair in, int pair, const FilterStep &step, FilterState &state) const {
+        if (!leftAndRight[pair]) return in;
         const Pair side = (in - Pair{in[1], in[0]}) * both(0.5);
-        return in + (filterFrame(side, step, state) - side) * widen[pair];
+        return in + (filterFrame(side, step, state) - side);
     }
 };
 

@@ -98,7 +98,7 @@ TEST_CASE("surround raises the side signal of each left and right pair and keeps
     rig.setSurround(1.0F);
     const Stream middle = sine(48000, 1000.0, 48000.0, 0.1);
     Stream side = middle;
-    for (const int right : {1, 5, 7})
+    for (const int right : {1, 3, 5, 7})
         for (float &sample : side[right]) sample = -sample;
 
     const Stream middleOut = rig.run(middle);
