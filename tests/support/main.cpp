@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: MIT
 //
-// The main function of every test program: gives the process a machine root of its own, runs the tests, and takes the root away.
+// The main function of every test program: gives the process a machine root of its own, runs the tests, and takes the root away. A
+// helper (helper.h) runs instead in the root of the test that started it.
 #define DOCTEST_CONFIG_IMPLEMENT
 #include <doctest/doctest.h>
 
@@ -8,6 +9,8 @@
 #include <filesystem>
 #include <random>
 #include <string>
+
+#include "tests/support/helper.h"
 
 namespace {
 
@@ -22,6 +25,9 @@ void setVariable(const char *name, const std::string &value) {
 }  // namespace
 
 int main(int argc, char **argv) {
+    int helperResult = 0;
+    if (test::runHelper(argc, argv, helperResult)) return helperResult;
+
     namespace fs = std::filesystem;
     std::random_device random;
     const fs::path root = fs::temp_directory_path() / ("vxcomn-test-" + std::to_string(random()));
