@@ -40,7 +40,7 @@ RegistryRead RegistryKey::readText(WideView name, WideString &value) const {
     if (query(name, found) != status::ok) return RegistryRead::absent;
     if (found.type != RegistryType::sz) return RegistryRead::wrongType;
     WideString text(found.data.size() / sizeof(VXWCHAR), VXWCHAR{0});  // an odd byte at the end is no unit
-    std::memcpy(text.data(), found.data.data(), text.size() * sizeof(VXWCHAR));
+    if (!text.empty()) std::memcpy(text.data(), found.data.data(), text.size() * sizeof(VXWCHAR));
     value = text.substr(0, text.find(VXWCHAR{0}));
     return RegistryRead::value;
 }

@@ -4,16 +4,25 @@
 // process must not have used its own root by then, so such tests run in a helper.
 #pragma once
 
+#include <cstdio>
 #include <functional>
+#include <iostream>
 
 #include <sys/wait.h>
 #include <unistd.h>
 
 namespace test {
 
+// What stands in buffers must not be printed by both sides.
+inline pid_t forkFlushed() {
+    std::cout.flush();
+    std::fflush(nullptr);
+    return fork();
+}
+
 // The child's exit status, or -1 if a signal ended it: a crash, or an alarm after twenty seconds.
 inline int inFork(const std::function<int()> &body) {
-    const pid_t child = fork();
+    const pid_t child = forkFlushed();
     if (child == 0) {
         alarm(20);
         _exit(body());

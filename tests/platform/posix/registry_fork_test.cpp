@@ -27,7 +27,7 @@ TEST_CASE_FIXTURE(test::RegistryFixture, "parent and child of a fork both go on 
 
 TEST_CASE_FIXTURE(test::RegistryFixture, "parent and child of a fork write at once and no write is lost") {
     CHECK(key.setU32(VX_TEXT("before"), 1) == status::ok);
-    const pid_t child = fork();
+    const pid_t child = test::forkFlushed();
     const WideString own = child == 0 ? VX_TEXT("child ") : VX_TEXT("parent ");
     int failures = 0;
     for (uint32_t i = 0; i < 200; ++i) failures += key.setU32(own + toWide(std::to_string(i)), i) != status::ok ? 1 : 0;

@@ -1,7 +1,10 @@
 // SPDX-License-Identifier: MIT
 //
-// As a debugger gets it: the system raises an exception that carries the text, the wide one first if there is one.
+// As a debugger gets it: the system raises an exception that carries the text. Some systems raise one that carries wide text first;
+// others turn wide text into the code page of the day and raise the narrow one.
 #include "tests/platform/debug_capture.h"
+
+#include <iterator>
 
 #include "platform/text.h"
 #include "platform/windows/sdk.h"
@@ -21,7 +24,10 @@ void keep(std::string text) {
 LONG CALLBACK onException(EXCEPTION_POINTERS *pointers) {
     const EXCEPTION_RECORD &record = *pointers->ExceptionRecord;
     if (record.ExceptionCode == kNarrowText) {
-        keep(reinterpret_cast<const char *>(record.ExceptionInformation[1]));
+        const auto *text = reinterpret_cast<const char *>(record.ExceptionInformation[1]);
+        wchar_t wide[256];
+        MultiByteToWideChar(CP_ACP, 0, text, -1, wide, static_cast<int>(std::size(wide)));
+        keep(vxcomn::toUtf8(wide));
     } else if (record.ExceptionCode == kWideText) {
         keep(vxcomn::toUtf8(reinterpret_cast<const wchar_t *>(record.ExceptionInformation[1])));
     } else {

@@ -42,7 +42,7 @@ std::string quoted(const std::string &argument) {
         backslashes = c == '\\' ? backslashes + 1 : 0;
         text.push_back(c);
     }
-    return text.append(backslashes, '\\') + "\"";
+    return text.append(backslashes, '\\').append("\"");
 }
 
 // A pipe of which the child inherits one end.
@@ -89,7 +89,7 @@ Process::Process(const std::string &program, const std::vector<std::string> &arg
     makePipe(out, impl_->output, false);
     makePipe(errors, errorOutput, false);
     std::string line = quoted(program);
-    for (const std::string &argument : arguments) line += " " + quoted(argument);
+    for (const std::string &argument : arguments) line.append(" ").append(quoted(argument));
     std::wstring command = wide(line);
     STARTUPINFOW start{};
     start.cb = sizeof start;
