@@ -48,11 +48,19 @@ std::unique_ptr<FirPlan> makePlan(int tapCount) {
     plan->log2Size = log2SizeFor(tapCount);
     plan->fftSize = 1 << plan->log2Size;
     plan->twiddles = &firTwiddles(plan->log2Size);
+    plan->kernels = firKernels(plan->log2Size);
     const size_t size = static_cast<size_t>(plan->fftSize);
+    size_t workValues = 2 * size;
+    size_t responseValues = 2 * size;
+    if (plan->kernels != nullptr) {
+        plan->tables = &firKernelTables(*plan->kernels, plan->log2Size);
+        workValues = static_cast<size_t>(firScratchValues(*plan->kernels, plan->log2Size));
+        responseValues = 4 * size;
+    }
     plan->taps = makeAlignedArray<float>(static_cast<size_t>(tapCount));
     plan->overlap = makeAlignedArray<float>(size / 2);
-    plan->work = makeAlignedArray<double>(2 * size);
-    for (auto &response : plan->responses) response = makeAlignedArray<double>(2 * size);
+    plan->work = makeAlignedArray<double>(workValues);
+    for (auto &response : plan->responses) response = makeAlignedArray<double>(responseValues);
     return plan;
 }
 
@@ -63,6 +71,7 @@ void fillResponse(const FirPlan &plan, double *response, const float *taps, int 
     }
     for (int i = 2 * tapCount; i < 2 * plan.fftSize; ++i) response[i] = 0.0;
     firTransform(response, plan.log2Size, plan.twiddles->forward);
+    if (plan.kernels != nullptr) firArrangeResponse(*plan.kernels, plan.log2Size, response, response + 2 * plan.fftSize);
 }
 
 // Takes the filter's memory away and gives the record new memory, or none.

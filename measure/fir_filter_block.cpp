@@ -38,6 +38,16 @@ VXCOMN_RT void processPiece(const FftFirFilter &filter, const FirPlan &plan, con
     for (int i = half; i < half + length; ++i) overlap[i - length] = static_cast<float>(work[2 * i] * scale);
 }
 
+VXCOMN_RT void processPlain(const FftFirFilter &filter, const FirPlan &plan, const double *response, const float *in, float *out,
+                            int count) noexcept {
+    const int half = plan.fftSize / 2;
+    for (int done = 0; done < count;) {
+        const int length = count - done < half ? count - done : half;
+        processPiece(filter, plan, response, in + done, out + done, length);
+        done += length;
+    }
+}
+
 VXCOMN_RT void clearValues(float *values, int count) noexcept {
     for (int i = 0; i < count; ++i) {
         values[i] = 0.0f;
@@ -59,11 +69,11 @@ VXCOMN_RT void FftFirFilter::process(const float *in, float *out, int count) {
         std::atomic_ref(taps).load(std::memory_order_relaxed) != nullptr) {
         const FirPlan &memory = *reinterpret_cast<const FirPlan *>(gate);
         const double *const used = std::atomic_ref(response).load(std::memory_order_seq_cst);
-        const int half = memory.fftSize / 2;
-        for (int done = 0; done < count;) {
-            const int length = count - done < half ? count - done : half;
-            processPiece(*this, memory, used, in + done, out + done, length);
-            done += length;
+        // A hook wants to see interleaved values, so it gets the plain form.
+        if (memory.kernels != nullptr && beforeTransform == nullptr && afterTransform == nullptr) {
+            memory.kernels->process({in, out, count, overlap, work, used + 2 * memory.fftSize, memory.tables, memory.log2Size});
+        } else {
+            processPlain(*this, memory, used, in, out, count);
         }
     }
     blocks.inside.fetch_sub(1, std::memory_order_seq_cst);

@@ -2,26 +2,44 @@
 //
 // The fast forms of the FIR filter's block, one for each instruction set. All give the bits of the plain form.
 //
-// A kernel has its own order of the response and its own tables; both are made for it by control calls.
+// Where their speed comes from is told in fir_kernels_impl.h. A kernel works on split planes in an order of its own, so it has its
+// own tables (fir_kernel_tables.h) and its own arrangement of the response; control calls make both.
 #pragma once
 
-#include <cstddef>
-
-#include "measure/fir_twiddles.h"
 #include "measure/instruction_set.h"
+#include "measure/realtime.h"
 
 namespace vxcomn {
 
-struct FirKernelTables {};
-struct FirBlock;
+struct FirKernelTables;
+
+// One call of `process`. No pointer is null, count is at least 1.
+struct FirBlock {
+    const float *in;
+    float *out;  // may be `in`
+    int count;
+    float *overlap;          // size / 2 values
+    double *work;            // firScratchValues() values, on a 64-byte border
+    const double *response;  // as firArrangeResponse() put it
+    const FirKernelTables *tables;
+    int log2Size;
+};
 
 struct FirKernels {
-    int minLog2Size;
-    size_t (*scratchValues)(int log2Size);
-    void (*arrangeResponse)(const double *response, double *arranged, int log2Size);
+    int lanes;        // doubles a register
+    int group;        // the last `group` values of the transform are worked on within registers; a power of two
+    int minLog2Size;  // smaller transforms don't fill the registers
     void (*process)(const FirBlock &block) noexcept;
 };
 
+extern const FirKernels kFirKernelsSse2;
+extern const FirKernels kFirKernelsAvx2;
+extern const FirKernels kFirKernelsAvx512;
+
+// The kernels for a filter of this size with the instruction set in use; null where the plain form serves best.
 const FirKernels *firKernels(int log2Size) noexcept;
+
+// Changes the instruction set of filters loaded from now on, for tests. The machine must have it.
+void selectFirKernels(InstructionSet set) noexcept;
 
 }  // namespace vxcomn

@@ -6,28 +6,12 @@
 
 #include <cstddef>
 #include <cstdint>
-#include <memory>
-#include <new>
 
-#include "measure/fir_kernels.h"
+#include "measure/fir_kernel_tables.h"
+#include "measure/fir_memory.h"
 #include "measure/fir_twiddles.h"
 
 namespace vxcomn {
-
-// Doubles and floats on a cache line's border, for the widest registers.
-struct AlignedRelease {
-    void operator()(void *memory) const noexcept { ::operator delete (memory, std::align_val_t{64}); }
-};
-template <typename T>
-using AlignedArray = std::unique_ptr<T[], AlignedRelease>;
-
-// `count` zeros.
-template <typename T>
-AlignedArray<T> makeAlignedArray(size_t count) {
-    AlignedArray<T> array(static_cast<T *>(::operator new (count * sizeof(T), std::align_val_t{64})));
-    for (size_t i = 0; i < count; ++i) array[i] = T{};
-    return array;
-}
 
 struct FirPlan {
     int32_t fftSize;  // the plan word itself, so it comes first
@@ -38,7 +22,7 @@ struct FirPlan {
     AlignedArray<float> taps;
     AlignedArray<float> overlap;
     AlignedArray<double> work;
-    // Two responses: one is in the record, the other is where the next one is made.
+    // Two responses: one is in the record, the other is where the next one is made. Each is followed by the kernels' arrangement.
     AlignedArray<double> responses[2];
     int current;
 };

@@ -32,11 +32,4 @@ const FirTwiddlePair &firTwiddles(int log2Size);
 // Transforms 2^log2Size interleaved complex values in place, without the division that follows an inverse transform.
 VXCOMN_RT void firTransform(double *values, int log2Size, const FirTwiddles &twiddles) noexcept;
 
-// The low `bits` bits of `value`, the other way round.
-VXCOMN_RT_INLINE int firReverseBits(int value, int bits) noexcept {
-    int result = 0;
-    for (int i = 0; i < bits; ++i) result |= ((value >> i) & 1) << (bits - 1 - i);
-    return result;
-}
-
 }  // namespace vxcomn
