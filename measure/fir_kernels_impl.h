@@ -382,6 +382,7 @@ VXCOMN_RT_INLINE void widen(const Piece &piece, const float *in, int length, int
     for (int j = i; j < padded; j += kLanes) {
         storeVector(piece.original + j, zero);
         storeVector(piece.positive + j, zero);
+        asm volatile("");  // keeps the loop from becoming a call to memset, which stands outside the block path
     }
     for (; i < length; ++i) {
         piece.original[i] = static_cast<double>(in[i]);
