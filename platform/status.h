@@ -20,6 +20,7 @@ inline constexpr Status notEnoughMemory = 8;
 inline constexpr Status genFailure = 31;
 inline constexpr Status sharingViolation = 32;
 inline constexpr Status notSupported = 50;
+inline constexpr Status fileExists = 80;
 inline constexpr Status invalidParameter = 87;
 inline constexpr Status diskFull = 112;
 inline constexpr Status insufficientBuffer = 122;
