@@ -1,0 +1,37 @@
+// SPDX-License-Identifier: MIT
+#include "preset/byte_cursor.h"
+
+#include <algorithm>
+
+namespace vxcomn {
+
+bool ByteCursor::seek(uint64_t position) {
+    const uint64_t windowEnd = this->position() + left_;
+    const bool inWindow = position >= windowStart_ && position <= windowEnd;
+    if (source_ == nullptr ? !inWindow : !source_->seek(position)) return false;
+    if (inWindow) {
+        next_ = begin_ + (position - windowStart_);
+        left_ = static_cast<size_t>(windowEnd - position);
+    } else {
+        windowStart_ = position;
+        begin_ = next_ = window_.get();
+        left_ = 0;
+    }
+    return true;
+}
+
+void ByteCursor::refill(size_t count) {
+    if (source_ == nullptr) return;
+    if (!window_) window_ = std::make_unique_for_overwrite<uint8_t[]>(kWindowBytes);
+    // What is left moves to the window's front, and the source fills the rest.
+    const uint64_t here = position();
+    if (left_ > 0) std::memmove(window_.get(), next_, left_);
+    windowStart_ = here;
+    begin_ = next_ = window_.get();
+    // Up to the expected end in one go; behind it by whole windows, so that no input makes a file be read word by word.
+    const uint64_t ahead = expected_ > here + left_ ? expected_ - here : kWindowBytes;
+    const auto goal = static_cast<size_t>(std::min<uint64_t>(std::max<uint64_t>(count, ahead), kWindowBytes));
+    left_ += source_->readAt(here + left_, window_.get() + left_, goal - left_);
+}
+
+}  // namespace vxcomn
