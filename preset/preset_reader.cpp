@@ -39,8 +39,7 @@ class Load {
         if (parameters_ != nullptr && !bypassSeen_) {
             parameters_->parameter(kGlobalComponent, kBypassAllParam, kAllChannels, {&notBypassed, 1});
         }
-        const bool idCutOff = result_.fault == PresetFault::componentIdCutOff;
-        return end(!goOn_ ? PresetLoad::stopped : idCutOff ? PresetLoad::cutOff : PresetLoad::complete, VX_TEXT("Done\n"));
+        return end(!goOn_ ? PresetLoad::stopped : cutOff_ ? PresetLoad::cutOff : PresetLoad::complete, VX_TEXT("Done\n"));
     }
 
   private:
@@ -144,6 +143,7 @@ class Load {
             int32_t componentId = 0, paramIdMin = 0, paramIdMax = 0;
             if (!stream_.i32(componentId)) {
                 note(PresetFault::componentIdCutOff, at, 0);
+                cutOff_ = true;
                 return true;
             }
             const bool hasMin = stream_.i32(paramIdMin);
@@ -199,6 +199,7 @@ class Load {
     LongHeader header_;
     bool goOn_ = true;
     bool damaged_ = false;
+    bool cutOff_ = false;
     bool bypassSeen_ = false;
     uint8_t firstByte_ = 0;
     PresetLoadResult result_;
