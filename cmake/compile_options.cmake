@@ -20,7 +20,7 @@ if(WIN32)
     # the assembler makes the spills of wide registers unaligned moves.
     add_compile_definitions(UNICODE _UNICODE WIN32_LEAN_AND_MEAN NOMINMAX _WIN32_WINNT=0x0A00)
     add_compile_options($<$<COMPILE_LANGUAGE:CXX>:-Wa,-muse-unaligned-vector-move>)
-    add_link_options(-static -fstack-protector-strong)
+    add_link_options(-static)
 endif()
 
 if(VXCOMN_SANITIZE)
