@@ -11,8 +11,9 @@ add_compile_options(
 if(CMAKE_CXX_COMPILER_ID STREQUAL "GNU")
     # The block path may call nothing outside its section, so no loop may turn into a call of memset or memcpy.
     add_compile_options(-fno-tree-loop-distribute-patterns)
-    # Two warnings that g++ 12 raises for its own library's strings and vectors, without cause.
-    add_compile_options($<$<COMPILE_LANGUAGE:CXX>:-Wno-restrict> $<$<COMPILE_LANGUAGE:CXX>:-Wno-stringop-overflow>)
+    # Warnings that g++ 12 raises for its own library's strings and vectors, without cause.
+    add_compile_options($<$<COMPILE_LANGUAGE:CXX>:-Wno-restrict> $<$<COMPILE_LANGUAGE:CXX>:-Wno-stringop-overflow>
+                        $<$<COMPILE_LANGUAGE:CXX>:-Wno-array-bounds>)
 endif()
 
 if(WIN32)
