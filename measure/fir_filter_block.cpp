@@ -62,8 +62,7 @@ using namespace vxcomn;
 
 VXCOMN_RT void FftFirFilter::process(const float *in, float *out, int count) {
     if (count < 1) return;
-    FirBlockCount &blocks = firBlockCount(this, sizeof(FftFirFilter));
-    blocks.inside.fetch_add(1, std::memory_order_seq_cst);
+    std::atomic<uint32_t> &inside = enterFirBlock(firBlockCount(this, sizeof(FftFirFilter)));
     const int32_t *const gate = std::atomic_ref(plan).load(std::memory_order_seq_cst);
     if (gate != nullptr && std::atomic_ref(tapCount).load(std::memory_order_relaxed) != 0 &&
         std::atomic_ref(taps).load(std::memory_order_relaxed) != nullptr) {
@@ -76,13 +75,12 @@ VXCOMN_RT void FftFirFilter::process(const float *in, float *out, int count) {
             processPlain(*this, memory, used, in, out, count);
         }
     }
-    blocks.inside.fetch_sub(1, std::memory_order_seq_cst);
+    leaveFirBlock(inside);
 }
 
 VXCOMN_RT void FftFirFilter::clearOverlap() {
-    FirBlockCount &blocks = firBlockCount(this, sizeof(FftFirFilter));
-    blocks.inside.fetch_add(1, std::memory_order_seq_cst);
+    std::atomic<uint32_t> &inside = enterFirBlock(firBlockCount(this, sizeof(FftFirFilter)));
     const int32_t *const gate = std::atomic_ref(plan).load(std::memory_order_seq_cst);
     if (gate != nullptr) clearValues(overlap, *gate / 2);
-    blocks.inside.fetch_sub(1, std::memory_order_seq_cst);
+    leaveFirBlock(inside);
 }

@@ -9,41 +9,15 @@
 #include <random>
 #include <vector>
 
-#include "measure/fir_kernels.h"
+#include "tests/measure/fir_fixture.h"
 #include "tests/measure/plain_fir.h"
-#include "vxcomn/measurement_records.h"
 
 namespace {
 
-using vxcomn::InstructionSet;
-
-// Selects each set in turn; the chosen one is back afterwards.
-template <typename Body>
-void withEachInstructionSet(Body body) {
-    for (int set = 0; set <= static_cast<int>(vxcomn::bestInstructionSet()); ++set) {
-        CAPTURE(vxcomn::instructionSetName(static_cast<InstructionSet>(set)));
-        vxcomn::selectFirKernels(static_cast<InstructionSet>(set));
-        body();
-    }
-    vxcomn::selectFirKernels(vxcomn::chosenInstructionSet());
-}
-
-struct Filter : FftFirFilter {
-    Filter() { create(); }
-    explicit Filter(const std::vector<float> &newTaps) : Filter() { load(newTaps.data(), static_cast<int>(newTaps.size()), 48000); }
-    ~Filter() { dispose(); }
-    Filter(const Filter &) = delete;
-    Filter &operator=(const Filter &) = delete;
-};
-
+using fir::Filter;
+using fir::randomValues;
+using fir::withEachInstructionSet;
 using Random = std::mt19937;
-
-std::vector<float> randomValues(Random &random, int count) {
-    std::uniform_real_distribution<float> uniform(-1.0f, 1.0f);
-    std::vector<float> values(static_cast<size_t>(count));
-    for (float &value : values) value = uniform(random);
-    return values;
-}
 
 // Runs both forms in place over `samples`, cut as told, and tells where they first differ: -1 for nowhere.
 int firstDifference(FftFirFilter &filter, plain::Fir &judge, std::vector<float> samples, const std::vector<int> &cuts) {
