@@ -3,9 +3,6 @@
 // The kernels for machines with AVX-512 (F, BW, DQ, VL). See measure/kernels.h.
 #include "measure/kernels.h"
 
-// g++ 12 takes the undefined pass-through of its own 512-bit intrinsics for a variable that was forgotten.
-#pragma GCC diagnostic ignored "-Wmaybe-uninitialized"
-
 #include <immintrin.h>
 
 #include "measure/level_lanes.h"
