@@ -14,6 +14,17 @@
 
 namespace vxcomn {
 
+// Where a sweep stands, behind its lead-in.
+struct SweepRun {
+    const float *table;
+    double position;  // fractional table index
+    double step;      // table indexes a sample
+    double highest;   // last position
+    double phase;     // radians
+    double radiansPerHz;
+    double hz;  // frequency of the last sample
+};
+
 struct MeasureKernels {
     // Raises each channel's peak to the largest magnitude of its samples; NaN never raises.
     void (*peaks)(float *const *channels, float *peaks, int channelCount, int frameCount);
@@ -23,6 +34,10 @@ struct MeasureKernels {
     void (*mean)(float *const *channels, int channelCount, int from, int count, float *mean);
     // to[i] = from[i]; the two don't overlap.
     void (*copy)(const float *from, int count, float *to);
+    // Sines of a phase that grows by `step` a sample, each rounded to f32 once. Returns the phase behind the block.
+    double (*sine)(double phase, double step, float *samples, int count);
+    // At least one sample of a sweep.
+    void (*sweep)(SweepRun &run, float *samples, int count);
 };
 
 // The table in use. Written while the library loads and by tests, when no block runs; read by everybody.

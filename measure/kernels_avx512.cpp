@@ -6,6 +6,7 @@
 #include <immintrin.h>
 
 #include "measure/level_lanes.h"
+#include "measure/source_lanes.h"
 
 namespace vxcomn {
 namespace {
@@ -21,6 +22,16 @@ struct Level {
     VXCOMN_RT_INLINE static Floats magnitude(Floats value) { return _mm512_abs_ps(value); }
     VXCOMN_RT_INLINE static bool anyLarger(Floats a, Floats b) { return _mm512_cmp_ps_mask(a, b, _CMP_GT_OQ) != 0; }
     VXCOMN_RT_INLINE static float highest(Floats value) { return _mm512_reduce_max_ps(value); }
+};
+
+struct Wave {
+    using Doubles = __m512d;
+    using Integers = __attribute__((vector_size(64))) int64_t;
+    static constexpr int kLanes = 8;
+    VXCOMN_RT_INLINE static Doubles load(const double *from) { return _mm512_loadu_pd(from); }
+    VXCOMN_RT_INLINE static void store(double *to, Doubles value) { _mm512_storeu_pd(to, value); }
+    VXCOMN_RT_INLINE static void storeRounded(float *to, Doubles value) { _mm256_storeu_ps(to, _mm512_cvtpd_ps(value)); }
+    VXCOMN_RT_INLINE static bool all(Integers mask) { return _mm512_movepi64_mask(__builtin_bit_cast(__m512i, mask)) == 255; }
 };
 
 VXCOMN_RT void peaks(float *const *channels, float *peaks, int channelCount, int frameCount) {
@@ -39,8 +50,16 @@ VXCOMN_RT void copy(const float *from, int count, float *to) {
     copyInLanes<Level>(from, count, to);
 }
 
+VXCOMN_RT double sine(double phase, double step, float *samples, int count) {
+    return sineBlock<Wave>(phase, step, samples, count);
+}
+
+VXCOMN_RT void sweep(SweepRun &run, float *samples, int count) {
+    sweepBlock<Wave>(run, samples, count);
+}
+
 }  // namespace
 
-constinit const MeasureKernels kMeasureKernelsAvx512 = {peaks, anyAbove, mean, copy};
+constinit const MeasureKernels kMeasureKernelsAvx512 = {peaks, anyAbove, mean, copy, sine, sweep};
 
 }  // namespace vxcomn

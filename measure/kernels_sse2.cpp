@@ -6,6 +6,7 @@
 #include <immintrin.h>
 
 #include "measure/level_lanes.h"
+#include "measure/source_lanes.h"
 
 namespace vxcomn {
 namespace {
@@ -26,6 +27,18 @@ struct Level {
     }
 };
 
+struct Wave {
+    using Doubles = __m128d;
+    using Integers = __attribute__((vector_size(16))) int64_t;
+    static constexpr int kLanes = 2;
+    VXCOMN_RT_INLINE static Doubles load(const double *from) { return _mm_loadu_pd(from); }
+    VXCOMN_RT_INLINE static void store(double *to, Doubles value) { _mm_storeu_pd(to, value); }
+    VXCOMN_RT_INLINE static void storeRounded(float *to, Doubles value) {
+        _mm_storel_pi(reinterpret_cast<__m64 *>(to), _mm_cvtpd_ps(value));
+    }
+    VXCOMN_RT_INLINE static bool all(Integers mask) { return _mm_movemask_pd(__builtin_bit_cast(__m128d, mask)) == 3; }
+};
+
 VXCOMN_RT void peaks(float *const *channels, float *peaks, int channelCount, int frameCount) {
     peaksInLanes<Level>(channels, peaks, channelCount, frameCount);
 }
@@ -42,8 +55,16 @@ VXCOMN_RT void copy(const float *from, int count, float *to) {
     copyInLanes<Level>(from, count, to);
 }
 
+VXCOMN_RT double sine(double phase, double step, float *samples, int count) {
+    return sineBlock<Wave>(phase, step, samples, count);
+}
+
+VXCOMN_RT void sweep(SweepRun &run, float *samples, int count) {
+    sweepBlock<Wave>(run, samples, count);
+}
+
 }  // namespace
 
-constinit const MeasureKernels kMeasureKernelsSse2 = {peaks, anyAbove, mean, copy};
+constinit const MeasureKernels kMeasureKernelsSse2 = {peaks, anyAbove, mean, copy, sine, sweep};
 
 }  // namespace vxcomn

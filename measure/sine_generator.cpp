@@ -2,7 +2,7 @@
 //
 // A sine of full amplitude, one record a channel. `generate` runs on the render thread; `setFrequency` may come from a control call
 // at any time and meets it in single words: a block that began before finishes with the old step.
-#include "measure/exact_sine.h"
+#include "measure/kernels.h"
 #include "measure/realtime.h"
 #include "vxcomn/measurement_records.h"
 
@@ -76,13 +76,8 @@ VXCOMN_RT void SineGenerator::generate(float *buffer, int offset, int count) {
     }
     if (count > 0) {
         const float step = load(PhaseStep);
-        double phase = Phase;
-        for (int i = 0; i < count; ++i) {
-            buffer[offset + i] = exactSine(phase);
-            phase += step;
-        }
         CurrentStep = step;
-        Phase = phase;
+        Phase = measureKernels->sine(Phase, step, buffer + offset, count);
     }
     if (Phase >= kWrap) Phase = wrapped(Phase);
 }

@@ -6,7 +6,7 @@
 // Kept: the sweep has no end of its own. Past its stop frequency it climbs on to the table's last entry but one and stays there;
 // whoever armed it ends it.
 #include "measure/band_tables.h"
-#include "measure/exact_sine.h"
+#include "measure/kernels.h"
 #include "measure/realtime.h"
 #include "measure/saturate.h"
 #include "measure/sweep_step.h"
@@ -57,8 +57,13 @@ void SweepGenerator::arm(int rate, int start, int stop, int sweepTimeMs, float p
 }
 
 VXCOMN_RT void SweepGenerator::generate(float *buffer, int offset, int count) {
-    for (int i = 0; i < count; ++i) {
-        buffer[offset + i] = Position < PreDelaySamples ? 0.0F : exactSine(Phase);
-        advanceSweep(*this);
-    }
+    int i = 0;
+    for (; i < count && Position < PreDelaySamples; ++i, ++Position) buffer[offset + i] = 0.0F;
+    if (i >= count) return;
+    SweepRun run{Table, TablePosition, TableStep, TableSize - 2.0, Phase, RadiansPerHz, CurrentFrequency};
+    measureKernels->sweep(run, buffer + offset + i, count - i);
+    TablePosition = run.position;
+    Phase = run.phase;
+    CurrentFrequency = run.hz;
+    Position += count - i;
 }
