@@ -32,7 +32,7 @@ VXCOMN_RT_INLINE void sineInLanes(const double *phases, float *samples) {
     // The polynomial whose largest relative error on -pi/2 to pi/2 is smallest, 2^-52.3.
     const D tail =
         (((((-0x1.9f1517a210b2bp-41 * z + 0x1.60e6bedfc05fcp-33) * z - 0x1.ae6355aab12a0p-26) * z + 0x1.71de3806ae2eap-19) * z -
-          0x1.a01a01a659fbbp-13) *
+          0x1.a01a019a659fbp-13) *
              z +
          0x1.111111110a573p-7) *
             z -
