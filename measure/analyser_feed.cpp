@@ -8,6 +8,7 @@
 // blocks.
 #include <cstdlib>
 
+#include "measure/float_buffer.h"
 #include "measure/kernels.h"
 #include "measure/realtime.h"
 #include "vxcomn/measurement_records.h"
@@ -35,9 +36,9 @@ void RealTimeAnalyser::dispose() {
     std::free(ring);
     std::free(writeIndex);
     std::free(readIndex);
-    std::free(window);
+    freeFloats(window);
     std::free(fftSize);
-    std::free(work);
+    freeFloats(work);
     ring = window = work = nullptr;
     writeIndex = readIndex = fftSize = nullptr;
     capacity = 0;

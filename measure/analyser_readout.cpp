@@ -8,19 +8,19 @@
 #include "measure/band_integration.h"
 #include "measure/band_tables.h"
 #include "measure/exact_sine.h"
+#include "measure/float_buffer.h"
+#include "measure/kernels.h"
 #include "vxcomn/measurement_records.h"
 
 using namespace vxcomn;
 
 namespace {
 
-constexpr float kClamp = 1e6F;
-
 bool allocate(RealTimeAnalyser &analyser, int size) {
     const auto half = static_cast<size_t>(size) / 2;
     analyser.fftSize = static_cast<int32_t *>(std::malloc(sizeof(int32_t)));
-    analyser.work = static_cast<float *>(std::calloc(4 * half, sizeof(float)));
-    analyser.window = static_cast<float *>(std::malloc(half * sizeof(float)));
+    analyser.work = allocateFloats(5 * half);
+    analyser.window = allocateFloats(half);
     if (analyser.fftSize == nullptr || analyser.work == nullptr || analyser.window == nullptr) return false;
     *analyser.fftSize = size;
     for (size_t i = 0; i < half; ++i) {
@@ -32,10 +32,20 @@ bool allocate(RealTimeAnalyser &analyser, int size) {
 
 void release(RealTimeAnalyser &analyser) {
     std::free(analyser.fftSize);
-    std::free(analyser.work);
-    std::free(analyser.window);
+    freeFloats(analyser.work);
+    freeFloats(analyser.window);
     analyser.fftSize = nullptr;
     analyser.work = analyser.window = nullptr;
+}
+
+// The tables of all stages of a size, by the power of two of their butterflies' distance. False if memory is out.
+constexpr int kStages = 31;
+bool stagesOf(int size, StageTwiddles *stages) {
+    for (int bit = 0; (1 << bit) < size; ++bit) {
+        stages[bit] = stageTwiddles(1 << bit);
+        if (stages[bit].real == nullptr) return false;
+    }
+    return true;
 }
 
 // A size that can be transformed and whose samples the ring can hold.
@@ -52,29 +62,26 @@ void RealTimeAnalyser::readBands(int integrate, int size, int bandsPerOctave) {
         release(*this);
         return;
     }
+    StageTwiddles stages[kStages];
+    if (!stagesOf(size, stages)) return;
+
     const int half = size / 2;
     const int write = __atomic_load_n(writeIndex, __ATOMIC_ACQUIRE);
     int start = write - half;
     if (start < 0) start += capacity;
-    // Kept: with a frame as long as the ring the start is the end, nothing is copied, and the last transform's leavings are
-    // analysed.
-    if (start != write) {
-        for (int i = 0, from = start; i < half; ++i) {
-            work[2 * i] = ring[from];
-            if (++from == capacity) from = 0;
-        }
+    // While the frame is copied its first slot stands for the read position, so that a feed can't run into it.
+    __atomic_exchange_n(readIndex, start, __ATOMIC_ACQ_REL);
+    const int toEnd = capacity - start < half ? capacity - start : half;
+    if (size >= kSmallestFastTransform && half < capacity) {
+        measureKernels->spectrum({size, ring + start, ring, toEnd, window, stages, work});
+        __atomic_exchange_n(readIndex, write, __ATOMIC_ACQ_REL);
+    } else {
+        // Kept: with a frame as long as the ring the start is the end, nothing is copied, and what the last transform left in the
+        // real slots is analysed.
+        for (int i = 0; i < half && start != write; ++i) work[2 * i] = i < toEnd ? ring[start + i] : ring[i - toEnd];
+        __atomic_exchange_n(readIndex, write, __ATOMIC_ACQ_REL);
+        plainSpectrum(work, window, size, stages);
     }
-    __atomic_exchange_n(readIndex, write, __ATOMIC_ACQ_REL);
-    for (int k = 0; k < half; ++k) {
-        float value = work[2 * k];
-        if (value > kClamp) value = kClamp;
-        if (value < -kClamp) value = -kClamp;
-        work[2 * k] = value * window[k];
-        work[2 * k + 1] = 0.0F;
-    }
-    for (int i = size; i < 2 * size; ++i) work[i] = 0.0F;
-    transformInPlace(work, size);
-    powerInPlace(work, size);
 
     const float *edges = nullptr, *centres = nullptr;
     int tableSize = 0;

@@ -2,9 +2,9 @@
 #include "measure/analyser_transform.h"
 
 #include <atomic>
-#include <cstdlib>
 
 #include "measure/exact_sine.h"
+#include "measure/float_buffer.h"
 
 namespace vxcomn {
 namespace {
@@ -13,7 +13,7 @@ namespace {
 struct TwiddleTables {
     std::atomic<float *> stage[31] = {};
     ~TwiddleTables() {
-        for (auto &slot : stage) std::free(slot.load());
+        for (auto &slot : stage) freeFloats(slot.load());
     }
 };
 TwiddleTables tables;
@@ -33,25 +33,7 @@ void draw(int half, float *real, float *imaginary) {
     }
 }
 
-}  // namespace
-
-StageTwiddles stageTwiddles(int half) noexcept {
-    std::atomic<float *> &slot = tables.stage[__builtin_ctz(static_cast<unsigned>(half))];
-    float *table = slot.load(std::memory_order_acquire);
-    if (table == nullptr) {
-        table = static_cast<float *>(std::malloc(2 * static_cast<size_t>(half) * sizeof(float)));
-        if (table == nullptr) return {nullptr, nullptr};
-        draw(half, table, table + half);
-        float *other = nullptr;
-        if (!slot.compare_exchange_strong(other, table, std::memory_order_acq_rel)) {
-            std::free(table);
-            table = other;
-        }
-    }
-    return {table, table + half};
-}
-
-void transformInPlace(float *points, int size) noexcept {
+void transformInPlace(float *points, int size, const StageTwiddles *stages) {
     for (int i = 0, j = 0; i < size; ++i) {
         if (j > i) {
             for (int part = 0; part < 2; ++part) {
@@ -68,8 +50,7 @@ void transformInPlace(float *points, int size) noexcept {
         j |= bit;
     }
     for (int half = 1; half < size; half *= 2) {
-        const StageTwiddles w = stageTwiddles(half);
-        if (w.real == nullptr) return;
+        const StageTwiddles &w = *stages++;
         for (int m = 0; m < half; ++m) {
             for (int i = m; i < size; i += 2 * half) {
                 float *const upper = points + 2 * i, *const lower = points + 2 * (i + half);
@@ -84,7 +65,7 @@ void transformInPlace(float *points, int size) noexcept {
     }
 }
 
-void powerInPlace(float *points, int size) noexcept {
+void powerInPlace(float *points, int size) {
     const float scale = 1.0F / static_cast<float>(size);
     const float g = scale * scale;
     const int half = size / 2;
@@ -95,6 +76,38 @@ void powerInPlace(float *points, int size) noexcept {
     }
     const float re = points[2 * half], im = points[2 * half + 1];
     points[half] = (re * re + im * im) * g;
+}
+
+}  // namespace
+
+StageTwiddles stageTwiddles(int half) noexcept {
+    std::atomic<float *> &slot = tables.stage[__builtin_ctz(static_cast<unsigned>(half))];
+    float *table = slot.load(std::memory_order_acquire);
+    if (table == nullptr) {
+        table = allocateFloats(2 * static_cast<size_t>(half));
+        if (table == nullptr) return {nullptr, nullptr};
+        draw(half, table, table + half);
+        float *other = nullptr;
+        if (!slot.compare_exchange_strong(other, table, std::memory_order_acq_rel)) {
+            freeFloats(table);
+            table = other;
+        }
+    }
+    return {table, table + half};
+}
+
+void plainSpectrum(float *points, const float *window, int size, const StageTwiddles *stages) noexcept {
+    constexpr float kClamp = 1e6F;
+    for (int k = 0; k < size / 2; ++k) {
+        float value = points[2 * k];
+        if (value > kClamp) value = kClamp;
+        if (value < -kClamp) value = -kClamp;
+        points[2 * k] = value * window[k];
+        points[2 * k + 1] = 0.0F;
+    }
+    for (int i = size; i < 2 * size; ++i) points[i] = 0.0F;
+    transformInPlace(points, size, stages);
+    powerInPlace(points, size);
 }
 
 }  // namespace vxcomn

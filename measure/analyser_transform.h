@@ -5,21 +5,16 @@
 // change. [control]
 #pragma once
 
-namespace vxcomn {
+#include "measure/kernels.h"
 
-// The twiddles of one stage: `half` of them, real and imaginary parts apart.
-struct StageTwiddles {
-    const float *real;
-    const float *imaginary;
-};
+namespace vxcomn {
 
 // The table for the stage whose butterflies lie `half` complex points apart, half a power of two. Null parts if memory is out.
 StageTwiddles stageTwiddles(int half) noexcept;
 
-// Transforms `size` complex points in place, interleaved, as the formulas are written. size is a power of two.
-void transformInPlace(float *points, int size) noexcept;
-
-// Puts the power of the bins 0 to size / 2 at the head of the transformed points.
-void powerInPlace(float *points, int size) noexcept;
+// The plain form, for transforms that have no kernel and for frames that begin with an earlier one's leavings: clamps and windows
+// the real slots of `size` interleaved points, clears all else, transforms them in place and puts the power of the bins 0 to size /
+// 2 at their head.
+void plainSpectrum(float *points, const float *window, int size, const StageTwiddles *stages) noexcept;
 
 }  // namespace vxcomn

@@ -25,6 +25,25 @@ struct SweepRun {
     double hz;  // frequency of the last sample
 };
 
+// The twiddles of one stage of the analyser's transform, real and imaginary parts apart.
+struct StageTwiddles {
+    const float *real;
+    const float *imaginary;
+};
+
+// The smallest transform that has a kernel: each pass takes whole vectors.
+inline constexpr int kSmallestFastTransform = 1024;
+
+// One spectrum: size / 2 samples, which the ring's end may cut in two.
+struct SpectrumJob {
+    int size;                     // a power of two, at least kSmallestFastTransform
+    const float *older, *newer;   // samples
+    int olderCount;               // of the size / 2
+    const float *window;          // size / 2 values
+    const StageTwiddles *stages;  // by the power of two of the distance between a butterfly's points
+    float *work;                  // 5 / 2 size floats; power of the bins 0 to size / 2 at its head afterwards
+};
+
 struct MeasureKernels {
     // Raises each channel's peak to the largest magnitude of its samples; NaN never raises.
     void (*peaks)(float *const *channels, float *peaks, int channelCount, int frameCount);
@@ -38,6 +57,8 @@ struct MeasureKernels {
     double (*sine)(double phase, double step, float *samples, int count);
     // At least one sample of a sweep.
     void (*sweep)(SweepRun &run, float *samples, int count);
+    // Clamp, window, transform and power. [control]
+    void (*spectrum)(const SpectrumJob &job);
 };
 
 // The table in use. Written while the library loads and by tests, when no block runs; read by everybody.

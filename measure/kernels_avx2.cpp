@@ -7,6 +7,7 @@
 
 #include "measure/level_lanes.h"
 #include "measure/source_lanes.h"
+#include "measure/transform_lanes.h"
 
 namespace vxcomn {
 namespace {
@@ -19,6 +20,13 @@ struct Level {
     VXCOMN_RT_INLINE static Floats broadcast(float value) { return _mm256_set1_ps(value); }
     // The second one where the first is NaN, as `a > b ? a : b` has it.
     VXCOMN_RT_INLINE static Floats larger(Floats a, Floats b) { return _mm256_max_ps(a, b); }
+    VXCOMN_RT_INLINE static Floats smaller(Floats a, Floats b) { return _mm256_min_ps(a, b); }
+    VXCOMN_RT_INLINE static Floats interleaveLow(Floats a, Floats b) {
+        return _mm256_permute2f128_ps(_mm256_unpacklo_ps(a, b), _mm256_unpackhi_ps(a, b), 0x20);
+    }
+    VXCOMN_RT_INLINE static Floats interleaveHigh(Floats a, Floats b) {
+        return _mm256_permute2f128_ps(_mm256_unpacklo_ps(a, b), _mm256_unpackhi_ps(a, b), 0x31);
+    }
     VXCOMN_RT_INLINE static Floats magnitude(Floats value) { return _mm256_andnot_ps(_mm256_set1_ps(-0.0F), value); }
     VXCOMN_RT_INLINE static bool anyLarger(Floats a, Floats b) { return _mm256_movemask_ps(_mm256_cmp_ps(a, b, _CMP_GT_OQ)) != 0; }
     VXCOMN_RT_INLINE static float highest(Floats value) {
@@ -62,8 +70,12 @@ VXCOMN_RT void sweep(SweepRun &run, float *samples, int count) {
     sweepBlock<Wave>(run, samples, count);
 }
 
+void spectrum(const SpectrumJob &job) {
+    spectrumInLanes<Level>(job);
+}
+
 }  // namespace
 
-constinit const MeasureKernels kMeasureKernelsAvx2 = {peaks, anyAbove, mean, copy, sine, sweep};
+constinit const MeasureKernels kMeasureKernelsAvx2 = {peaks, anyAbove, mean, copy, sine, sweep, spectrum};
 
 }  // namespace vxcomn

@@ -7,6 +7,7 @@
 
 #include "measure/level_lanes.h"
 #include "measure/source_lanes.h"
+#include "measure/transform_lanes.h"
 
 namespace vxcomn {
 namespace {
@@ -19,6 +20,13 @@ struct Level {
     VXCOMN_RT_INLINE static Floats broadcast(float value) { return _mm512_set1_ps(value); }
     // The second one where the first is NaN, as `a > b ? a : b` has it.
     VXCOMN_RT_INLINE static Floats larger(Floats a, Floats b) { return _mm512_max_ps(a, b); }
+    VXCOMN_RT_INLINE static Floats smaller(Floats a, Floats b) { return _mm512_min_ps(a, b); }
+    VXCOMN_RT_INLINE static Floats interleaveLow(Floats a, Floats b) {
+        return _mm512_permutex2var_ps(a, _mm512_setr_epi32(0, 16, 1, 17, 2, 18, 3, 19, 4, 20, 5, 21, 6, 22, 7, 23), b);
+    }
+    VXCOMN_RT_INLINE static Floats interleaveHigh(Floats a, Floats b) {
+        return _mm512_permutex2var_ps(a, _mm512_setr_epi32(8, 24, 9, 25, 10, 26, 11, 27, 12, 28, 13, 29, 14, 30, 15, 31), b);
+    }
     VXCOMN_RT_INLINE static Floats magnitude(Floats value) { return _mm512_abs_ps(value); }
     VXCOMN_RT_INLINE static bool anyLarger(Floats a, Floats b) { return _mm512_cmp_ps_mask(a, b, _CMP_GT_OQ) != 0; }
     VXCOMN_RT_INLINE static float highest(Floats value) { return _mm512_reduce_max_ps(value); }
@@ -58,8 +66,12 @@ VXCOMN_RT void sweep(SweepRun &run, float *samples, int count) {
     sweepBlock<Wave>(run, samples, count);
 }
 
+void spectrum(const SpectrumJob &job) {
+    spectrumInLanes<Level>(job);
+}
+
 }  // namespace
 
-constinit const MeasureKernels kMeasureKernelsAvx512 = {peaks, anyAbove, mean, copy, sine, sweep};
+constinit const MeasureKernels kMeasureKernelsAvx512 = {peaks, anyAbove, mean, copy, sine, sweep, spectrum};
 
 }  // namespace vxcomn

@@ -7,6 +7,7 @@
 
 #include "measure/level_lanes.h"
 #include "measure/source_lanes.h"
+#include "measure/transform_lanes.h"
 
 namespace vxcomn {
 namespace {
@@ -19,6 +20,9 @@ struct Level {
     VXCOMN_RT_INLINE static Floats broadcast(float value) { return _mm_set1_ps(value); }
     // The second one where the first is NaN, as `a > b ? a : b` has it.
     VXCOMN_RT_INLINE static Floats larger(Floats a, Floats b) { return _mm_max_ps(a, b); }
+    VXCOMN_RT_INLINE static Floats smaller(Floats a, Floats b) { return _mm_min_ps(a, b); }
+    VXCOMN_RT_INLINE static Floats interleaveLow(Floats a, Floats b) { return _mm_unpacklo_ps(a, b); }
+    VXCOMN_RT_INLINE static Floats interleaveHigh(Floats a, Floats b) { return _mm_unpackhi_ps(a, b); }
     VXCOMN_RT_INLINE static Floats magnitude(Floats value) { return _mm_andnot_ps(_mm_set1_ps(-0.0F), value); }
     VXCOMN_RT_INLINE static bool anyLarger(Floats a, Floats b) { return _mm_movemask_ps(_mm_cmpgt_ps(a, b)) != 0; }
     VXCOMN_RT_INLINE static float highest(Floats value) {
@@ -63,8 +67,12 @@ VXCOMN_RT void sweep(SweepRun &run, float *samples, int count) {
     sweepBlock<Wave>(run, samples, count);
 }
 
+void spectrum(const SpectrumJob &job) {
+    spectrumInLanes<Level>(job);
+}
+
 }  // namespace
 
-constinit const MeasureKernels kMeasureKernelsSse2 = {peaks, anyAbove, mean, copy, sine, sweep};
+constinit const MeasureKernels kMeasureKernelsSse2 = {peaks, anyAbove, mean, copy, sine, sweep, spectrum};
 
 }  // namespace vxcomn
