@@ -25,23 +25,80 @@ float interpolated(const float *power, float bin) {
     return (static_cast<float>(ceiling) - bin) * power[floor] + (bin - static_cast<float>(floor)) * power[ceiling];
 }
 
-// The integral of the linearly interpolated spectrum from one place to another.
-float integral(const float *power, int halfSize, float low, float high) {
+// A band whose ends are summed up, with the whole steps between bins `from` and `to` still to be added.
+struct OpenBand {
+    float sum;
+    int from, to;
+};
+
+// The integral of the linearly interpolated spectrum from one place to another, but for the whole steps in between.
+OpenBand openIntegral(const float *power, int halfSize, float low, float high) {
     const int a = static_cast<int>(low), b = static_cast<int>(high);
     const auto fa = static_cast<float>(a), fb = static_cast<float>(b);
     if (a == b) {
         const float middle = (low + high) / 2.0F;
         const float above = power[a < halfSize ? a + 1 : a];  // at the last bin the width is 0, and nothing lies behind it
-        return ((middle - fa) * above + ((fa + 1.0F) - middle) * power[a]) * (high - low);
+        return {((middle - fa) * above + ((fa + 1.0F) - middle) * power[a]) * (high - low), 0, 0};
     }
+    // The formula divides both pieces by the distance of their bins, which is 1.
     const int c = ceilingOf(low), d = ceilingOf(high);
     const auto fc = static_cast<float>(c), fd = static_cast<float>(d);
     const float middleLow = (fc + low) / 2.0F, middleHigh = (fb + high) / 2.0F;
-    float result = 0.0F;
-    if (c != a) result += ((fc - middleLow) * power[a] + (middleLow - fa) * power[c]) * (fc - low) / (fc - fa);
-    if (d != b) result += (high - fb) * ((fd - middleHigh) * power[b] + (middleHigh - fb) * power[d]) / (fd - fb);
-    for (int k = c; k < b; ++k) result += (power[k] + power[k + 1]) / 2.0F;
-    return result;
+    float sum = 0.0F;
+    if (c != a) sum += ((fc - middleLow) * power[a] + (middleLow - fa) * power[c]) * (fc - low);
+    if (d != b) sum += (high - fb) * ((fd - middleHigh) * power[b] + (middleHigh - fb) * power[d]);
+    return {sum, c, b};
+}
+
+float closed(const float *power, const OpenBand &band) {
+    float sum = band.sum;
+    for (int k = band.from; k < band.to; ++k) sum += (power[k] + power[k + 1]) / 2.0F;
+    return sum;
+}
+
+// The additions of one band keep their order, which makes them wait for each other; those of its neighbours, about as many, fill
+// the gaps.
+constexpr int kNeighbours = 6;
+void closeNeighbours(const float *power, const OpenBand *open, float *bands) {
+    float sum[kNeighbours];
+    int steps = open[0].to - open[0].from;
+    for (int j = 0; j < kNeighbours; ++j) {
+        sum[j] = open[j].sum;
+        steps = open[j].to - open[j].from < steps ? open[j].to - open[j].from : steps;
+    }
+    const float *const p0 = power + open[0].from, *const p1 = power + open[1].from, *const p2 = power + open[2].from;
+    const float *const p3 = power + open[3].from, *const p4 = power + open[4].from, *const p5 = power + open[5].from;
+    for (int k = 0; k < steps; ++k) {
+        sum[0] += (p0[k] + p0[k + 1]) / 2.0F;
+        sum[1] += (p1[k] + p1[k + 1]) / 2.0F;
+        sum[2] += (p2[k] + p2[k + 1]) / 2.0F;
+        sum[3] += (p3[k] + p3[k + 1]) / 2.0F;
+        sum[4] += (p4[k] + p4[k + 1]) / 2.0F;
+        sum[5] += (p5[k] + p5[k + 1]) / 2.0F;
+    }
+    const int done = steps > 0 ? steps : 0;
+    for (int j = 0; j < kNeighbours; ++j) bands[j] = closed(power, {sum[j], open[j].from + done, open[j].to});
+}
+
+void integrated(const float *power, int halfSize, const float *edges, int tableSize, float *bands, float binsPerHertz) {
+    OpenBand open[kNeighbours];
+    int gathered = 0;
+    float low = tableSize > 0 ? binOf(edges[0], binsPerHertz, halfSize) : 0.0F;
+    for (int i = 0; i + 1 < tableSize; ++i) {
+        const float high = binOf(edges[i + 1], binsPerHertz, halfSize);
+        const bool valid = low >= 0.0F && high >= 0.0F;
+        if (valid) open[gathered++] = openIntegral(power, halfSize, low, high);
+        low = high;
+        if (valid && gathered == kNeighbours) {
+            closeNeighbours(power, open, bands + i + 1 - kNeighbours);
+            gathered = 0;
+        } else if (!valid || i + 2 == tableSize) {
+            // What is gathered ends at band i, or at the one before a band that is left alone.
+            const int first = i + (valid ? 1 : 0) - gathered;
+            for (int j = 0; j < gathered; ++j) bands[first + j] = closed(power, open[j]);
+            gathered = 0;
+        }
+    }
 }
 
 }  // namespace
@@ -50,14 +107,13 @@ void integrateBands(const float *power, int halfSize, const float *edges, const 
                     int sampleRate, bool integrate) noexcept {
     if (halfSize < 1 || sampleRate < 1) return;
     const float binsPerHertz = static_cast<float>(2.0 * halfSize) / static_cast<float>(sampleRate);
+    if (integrate) {
+        integrated(power, halfSize, edges, tableSize, bands, binsPerHertz);
+        return;
+    }
     for (int i = 0; i + 1 < tableSize; ++i) {
-        if (integrate) {
-            const float low = binOf(edges[i], binsPerHertz, halfSize), high = binOf(edges[i + 1], binsPerHertz, halfSize);
-            if (low >= 0.0F && high >= 0.0F) bands[i] = integral(power, halfSize, low, high);
-        } else {
-            const float bin = binOf(centres[i], binsPerHertz, halfSize);
-            if (bin >= 0.0F) bands[i] = interpolated(power, bin);
-        }
+        const float bin = binOf(centres[i], binsPerHertz, halfSize);
+        if (bin >= 0.0F) bands[i] = interpolated(power, bin);
     }
 }
 
