@@ -40,9 +40,10 @@ VXCOMN_RT_INLINE bool isLocked(const VXAtomicByte &lock) noexcept {
 }
 
 VXCOMN_RT_INLINE void clearFirOverlapOnRequest(LibraryContext &context) noexcept {
-    if (context.processFirResetPending.load(std::memory_order_acquire) == 0) return;
+    if (context.processFirResetPending.load(std::memory_order_seq_cst) == 0) return;
+    // The request falls first: one that a load raises from here on stands until the next block.
+    context.processFirResetPending.store(0, std::memory_order_seq_cst);
     if (!isLocked(context.processFirBusy)) context.processFir.clearOverlap();
-    context.processFirResetPending.store(0, std::memory_order_relaxed);
 }
 
 VXCOMN_RT_INLINE void countSilence(const Block &block) noexcept {
@@ -81,7 +82,7 @@ VXCOMN_RT_INLINE void runEngine(VXHandle handle, const Block &block) noexcept {
     mixChannels(block.buffers, &context.inputFormat, &context.inputFormat);
     context.processAdapter(handle, block.buffers, &context.inputFormat, &context.outputFormat);
     constexpr uint32_t kModuleInBlock = 2;
-    if (context.isstLoaded != 0 && (context.hardwareMode & kModuleInBlock) != 0) {
+    if (loadShared(context.isstLoaded) != 0 && (loadShared(context.hardwareMode) & kModuleInBlock) != 0) {
         fixedPointProcess(context.isstHandle, block.buffers, &context.inputFormat, &context.outputFormat);
     }
 }

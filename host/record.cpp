@@ -6,8 +6,10 @@
 #include "VXDSPAPI.h"
 #include "host/host_context.h"
 #include "measure/capture_ring.h"
+#include "measure/capture_switch.h"
 #include "measure/onset_detector.h"
 #include "measure/peak_meter.h"
+#include "measure/saturate.h"
 #include "measure/tracking_notch.h"
 #include "platform/clock.h"
 #include "platform/float_mode.h"
@@ -26,10 +28,11 @@ int heldToRecordChannels(int channels) noexcept {
 
 void clearFirOverlapsOnRequest(LibraryContext &context) noexcept {
     if (!isUp(context.recordFirResetPending)) return;
+    // The request falls first: one that a load raises from here on stands until the next block.
+    context.recordFirResetPending.store(0, std::memory_order_seq_cst);
     for (int k = 0; k < VX_RECORD_CHANNELS; ++k) {
         if (!isUp(context.recordFirBusy[k])) context.recordFir[k].clearOverlap();
     }
-    context.recordFirResetPending.store(0, std::memory_order_relaxed);
 }
 
 void filter(LibraryContext &context, int i, float *samples, int frames) noexcept {
@@ -39,7 +42,7 @@ void filter(LibraryContext &context, int i, float *samples, int frames) noexcept
 
 // Kept: the rings run while both bytes are up, although the command that arms them leaves one down.
 void capture(LibraryContext &context, float *const *chan, int channels, int frames) noexcept {
-    if (!isUp(context.captureRequested) || !isUp(context.captureArmed)) return;
+    if (!capturesRun(context)) return;
     for (int i = 0; i < channels; ++i) {
         if (context.capture[i].active != 0) feedCaptureRing(context.capture[i], reinterpret_cast<uint32_t *>(chan[i]), frames);
     }
@@ -50,10 +53,10 @@ void capture(LibraryContext &context, float *const *chan, int channels, int fram
 void startTracker(LibraryContext &context, int i, int onset, int blockStart) noexcept {
     const SweepGenerator &sweep = context.sweep[i];
     const int rate = loadShared(context.recordSampleRate);
-    const double delay = (onset - blockStart) * 1000.0 / rate;
-    const int preDelay = static_cast<int>(delay + 0.5 * static_cast<double>(sweep.PreDelay));
+    const double delay = static_cast<double>(int64_t{onset} - blockStart) * 1000.0 / rate;
+    const int preDelay = truncateToInt32(delay + 0.5 * static_cast<double>(sweep.PreDelay));
     context.sweepTracker[i].arm(rate, sweep.StartFrequency, sweep.StopFrequency, sweep.SweepTime, static_cast<float>(preDelay),
-                                static_cast<float>(static_cast<int>(sweep.PostDelay)), sweep.BandsPerOctave);
+                                static_cast<float>(truncateToInt32(static_cast<double>(sweep.PostDelay))), sweep.BandsPerOctave);
 }
 
 void measureSweep(LibraryContext &context, int i, float *samples, int frames) noexcept {
@@ -67,10 +70,11 @@ void measureSweep(LibraryContext &context, int i, float *samples, int frames) no
         }
     }
     if (!isUp(context.sweepActive[i]) || !isUp(context.sweepTracking[i])) return;
+    int32_t next = context.distortionIndex[i];
     trackSweep(context.sweepTracker[i], context.trackingNotch[i],
-               {context.notchInputSum[i], context.notchOutputSum[i], context.distortion[i], context.distortionIndex[i],
-                context.distortionPoints[i]},
+               {context.notchInputSum[i], context.notchOutputSum[i], context.distortion[i], next, context.distortionPoints[i]},
                samples, frames, loadShared(context.recordSampleRate));
+    publish(context.distortionIndex[i], next);  // whoever reads it finds the figures below it complete
 }
 
 void measurePolarity(LibraryContext &context, int i, const float *samples, int frames) noexcept {
@@ -82,6 +86,17 @@ void measurePolarity(LibraryContext &context, int i, const float *samples, int f
     if (onset.peak < 0.0F) storeShared(context.polarityResult[i], -1);
 }
 
+// The meter's reader waits for the render side and not for this one, so it may empty a peak in the middle of a block. The block's
+// own peaks are taken first, and then raise what stands there.
+void meter(LibraryContext &context, float *const *chan, int channels, int frames) noexcept {
+    if (isUp(context.recordMeterLock)) return;
+    float peaks[VX_RECORD_CHANNELS] = {};
+    storeShared(context.recordMeterChannels, updatePeaks(chan, peaks, channels, frames));
+    for (int i = 0; i < channels; ++i) {
+        if (peaks[i] > loadShared(context.recordPeak[i])) storeShared(context.recordPeak[i], peaks[i]);
+    }
+}
+
 void recordBlock(VXHandle handle, LibraryContext &context, ProcessBuffers *buffers, IOFormat *format, int frames) noexcept {
     if (isUp(context.recordStop)) return;
     float *const *chan = buffers->channels;
@@ -91,7 +106,7 @@ void recordBlock(VXHandle handle, LibraryContext &context, ProcessBuffers *buffe
     capture(context, chan, channels, frames);
     for (int i = 0; i < channels; ++i) measureSweep(context, i, chan[i], frames);
     for (int i = 0; i < channels; ++i) measurePolarity(context, i, chan[i], frames);
-    if (!isUp(context.recordMeterLock)) context.recordMeterChannels = updatePeaks(chan, context.recordPeak, channels, frames);
+    meter(context, chan, channels, frames);
     if (!isUp(context.analyserLock[2]) && context.analyser[2].enabled != 0) {
         context.analyser[2].feed(loadShared(context.analyserFeedMode), chan, channels, frames);
     }
