@@ -4,6 +4,7 @@
 #include <algorithm>
 
 #include "host/host_context.h"
+#include "host/isst_module.h"
 
 namespace vxcomn {
 
@@ -35,8 +36,9 @@ void UpdateComponentEnable(VXEngineHandle handle, int32_t componentId) {
     const LibraryContext &context = contextOf(handle);
     const bool enable = context.componentEnable[componentId] != 0;
     const bool onISST = context.componentOnISST[componentId] != 0;
-    hostLog(context, VX_TEXT("ISSTModuleLoaded = %i, enable = %i.\n"), context.isstLoaded, enable);
-    if (context.isstLoaded == 0) {
+    const int32_t isstLoaded = loadShared(context.isstLoaded);
+    hostLog(context, VX_TEXT("ISSTModuleLoaded = %i, enable = %i.\n"), isstLoaded, enable);
+    if (isstLoaded == 0) {
         send(context.engineSetParameter, handle, componentId, kComponentEnable, enable);
         return;
     }
@@ -46,8 +48,9 @@ void UpdateComponentEnable(VXEngineHandle handle, int32_t componentId) {
 
 void UpdateDisableInputOutputGains(VXEngineHandle handle) {
     const LibraryContext &context = contextOf(handle);
-    hostLog(context, VX_TEXT("ISSTModuleLoaded = %i.\n"), context.isstLoaded);
-    if (context.isstLoaded == 0) {
+    const int32_t isstLoaded = loadShared(context.isstLoaded);
+    hostLog(context, VX_TEXT("ISSTModuleLoaded = %i.\n"), isstLoaded);
+    if (isstLoaded == 0) {
         send(context.engineSetParameter, handle, kGlobalComponent, kDisableInputGain, false);
         send(context.engineSetParameter, handle, kGlobalComponent, kDisableOutputGain, false);
         return;

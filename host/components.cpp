@@ -6,6 +6,7 @@
 #include "VXDSPAPI.h"
 #include "host/handshake.h"
 #include "host/host_context.h"
+#include "host/isst_module.h"
 
 namespace vxcomn {
 
@@ -61,7 +62,8 @@ void VXDSPAPI_SetInputGain(VXHandle handle, float gain) {
     const TraceScope scope(traceOf(context), VX_TEXT("VXDSPAPI_SetInputGain"));
     hostLog(context, VX_TEXT("Gain = %f.\n"), static_cast<double>(gain));
     if (context.engineSetInputGain != nullptr) context.engineSetInputGain(handle, gain);
-    if (context.isstLoaded != 0 && context.isstModule->engineSetInputGain != nullptr) {
+    const std::lock_guard lock(controlLock(&context));
+    if (isstInUse(context) && context.isstModule->engineSetInputGain != nullptr) {
         context.isstModule->engineSetInputGain(context.isstHandle, gain);
     }
 }

@@ -4,7 +4,9 @@
 // VXDSPAPI_SetIOFormat while no block runs.
 #include "VXDSPAPI.h"
 #include "host/channel_mixer.h"
+#include "host/handshake.h"
 #include "host/host_context.h"
+#include "host/isst_module.h"
 #include "host/measuring_objects.h"
 
 namespace vxcomn {
@@ -38,7 +40,8 @@ uint32_t setIOFormat(VXHandle handle, IOFormat *input, IOFormat *output) {
     createMeasuringObjects(context);
     uint32_t result = 0;
     if (context.engineSetIOFormat != nullptr) result = context.engineSetIOFormat(handle, input, output);
-    if (context.isstLoaded != 0 && context.isstModule->engineSetIOFormat != nullptr) {
+    const std::lock_guard lock(controlLock(&context));
+    if (isstInUse(context) && context.isstModule->engineSetIOFormat != nullptr) {
         result = context.isstModule->engineSetIOFormat(context.isstHandle, input, output);
     }
     return result;

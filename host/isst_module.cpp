@@ -28,7 +28,7 @@ void isstEventCallback(LibraryContext *context, int32_t code, int32_t subCode, c
     if (context == nullptr) return;
     if (code == -1) {
         // This is how the module declines to run while it starts.
-        if (subCode == -1 && context->hostType != 4) context->isstLoaded = 0;
+        if (subCode == -1 && context->hostType != 4) storeShared(context->isstLoaded, 0);
         return;
     }
     if (code != 0 || text == nullptr) return;
@@ -77,10 +77,24 @@ void createComponents(LibraryContext &context) {
     }
 }
 
+// Frees the instance and the module's context. Kept: the module's file stays loaded.
+void releaseModule(LibraryContext &context) {
+    LibraryContext *module = context.isstModule;
+    if (context.isstHandle != nullptr) {
+        if (module != nullptr && module->engineFree != nullptr) module->engineFree(context.isstHandle);
+        context.isstHandle = nullptr;
+    }
+    if (module != nullptr) {
+        destroyContext(module);
+        context.isstModule = nullptr;
+    }
+}
+
 }  // namespace
 
 int LoadISSTModule(LibraryContext &context) {
     const TraceScope scope(traceOf(context), VX_TEXT("LoadISSTModule"));
+    releaseModule(context);  // what a start that failed or a module that declined later has left
     context.isstModule = loadModuleContext(context);
     if (context.isstModule == nullptr) {
         hostLog(context, VX_TEXT("Failed to load iSST module!\n"));
@@ -91,15 +105,15 @@ int LoadISSTModule(LibraryContext &context) {
         hostLog(context, VX_TEXT("iSST module doesn't expose VXDSPAPI_SetParameter()!\n"));
         return 0;
     }
-    context.isstLoaded = 1;  // ahead of the start, so that the module's event can take it back
+    storeShared(context.isstLoaded, 1);  // ahead of the start, so that the module's event can take it back
     hostLog(context, VX_TEXT("Initializing library...\n"));
     context.isstHandle = startInstance(context);
     if (context.isstHandle == nullptr) {
         hostLog(context, VX_TEXT("Failed!\n"));
-        context.isstLoaded = 0;
+        storeShared(context.isstLoaded, 0);
         return 1;
     }
-    if (context.isstLoaded == 0) {
+    if (!isstInUse(context)) {
         hostLog(context, VX_TEXT("ISSTModuleLoaded = 0! Unloading iSST module.\n"));
         UnloadISSTModule(context);
     } else {
@@ -112,23 +126,16 @@ int LoadISSTModule(LibraryContext &context) {
 
 void UnloadISSTModule(LibraryContext &context) {
     const TraceScope scope(traceOf(context), VX_TEXT("UnloadISSTModule"));
-    LibraryContext *module = context.isstModule;
-    if (context.isstLoaded != 0) {
-        context.isstLoaded = 0;
+    const LibraryContext *module = context.isstModule;
+    if (isstInUse(context)) {
+        storeShared(context.isstLoaded, 0);
         if (module != nullptr && module->engineDisposeComponent != nullptr) {
             for (const auto &component : kComponents) {
                 module->engineDisposeComponent(context.isstHandle, component.type, static_cast<uint32_t>(component.id));
             }
         }
     }
-    if (context.isstHandle != nullptr) {
-        if (module != nullptr && module->engineFree != nullptr) module->engineFree(context.isstHandle);
-        context.isstHandle = nullptr;
-    }
-    if (module != nullptr) {
-        destroyContext(module);
-        context.isstModule = nullptr;
-    }
+    releaseModule(context);
 }
 
 }  // namespace vxcomn

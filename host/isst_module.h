@@ -2,8 +2,11 @@
 //
 // The iSST module: a second engine instance, on fixed-point samples, in series behind the main engine. Loaded and unloaded by
 // parameter -25. Control threads, with VXDSPAPI_Process held up.
+//
+// Whoever calls the module holds controlLock (host/handshake.h), so that it does not go away meanwhile.
 #pragma once
 
+#include "measure/shared_word.h"
 #include "vxcomn/library_context.h"
 
 namespace vxcomn {
@@ -14,5 +17,10 @@ int LoadISSTModule(LibraryContext &context);
 
 // Disposes the components and the instance, and frees the module's context. The module file itself stays loaded.
 void UnloadISSTModule(LibraryContext &context);
+
+// Whether the module takes part. The module's own event may end that from any thread.
+inline bool isstInUse(const LibraryContext &context) noexcept {
+    return loadShared(context.isstLoaded) != 0;
+}
 
 }  // namespace vxcomn

@@ -22,7 +22,7 @@ void disposeMeasuringObjects(LibraryContext &context) {
     hostLog(context, VX_TEXT("Disposing fftfir...\n"));
     context.processFir.dispose();
     for (FftFirFilter &filter : context.recordFir) filter.dispose();
-    if (context.isstLoaded != 0) UnloadISSTModule(context);
+    if (isstInUse(context)) UnloadISSTModule(context);
     hostLog(context, VX_TEXT("Done.\n"));
 }
 

@@ -3,14 +3,12 @@
 // Parameter routing: the one road by which a value reaches the engines. The host takes a reserved range of negative ids for itself,
 // hands everything else on, and keeps component enables and gains of the two engine instances in step. Control threads; engines
 // accept parameters during a block.
-#include <algorithm>
-#include <cstring>
-
 #include "VXDSPAPI.h"
 #include "host/component_routing.h"
 #include "host/handshake.h"
 #include "host/host_context.h"
 #include "host/isst_module.h"
+#include "measure/byte_cursors.h"
 
 namespace vxcomn {
 
@@ -36,69 +34,46 @@ struct Parameter {
     uint32_t dataSize;
 };
 
-// Reads little-endian words off the front of a parameter's data. Nothing is read past its end.
-class DataReader {
-  public:
-    explicit DataReader(const Parameter &parameter)
-        : data_(parameter.data), size_(parameter.data == nullptr ? 0 : parameter.dataSize) {}
-
-    template <class T>
-    bool read(T &value) {
-        if (sizeof value > size_ - position_) return false;
-        std::memcpy(&value, data_ + position_, sizeof value);
-        position_ += static_cast<uint32_t>(sizeof value);
-        return true;
-    }
-    bool readFloats(float *values, uint32_t count) {
-        if (count > (size_ - position_) / sizeof(float)) return false;
-        std::memcpy(values, data_ + position_, count * sizeof(float));
-        position_ += count * static_cast<uint32_t>(sizeof(float));
-        return true;
-    }
-    bool holdsFloats(uint32_t count) const { return count <= (size_ - position_) / sizeof(float); }
-    uint32_t size() const { return size_; }
-    uint32_t position() const { return position_; }
-
-  private:
-    const uint8_t *data_;
-    uint32_t size_;
-    uint32_t position_ = 0;
-};
+ByteReader readerOf(const Parameter &parameter) {
+    return {parameter.data, parameter.dataSize};
+}
 
 uint32_t setComponentByte(VXHandle handle, const Parameter &parameter, uint8_t (LibraryContext::*table)[VX_MAX_COMPONENTS]) {
     LibraryContext &context = contextOf(handle);
-    DataReader in(parameter);
+    ByteReader in = readerOf(parameter);
     uint8_t on = 0;
     if (parameter.componentId < 0 || parameter.componentId >= VX_MAX_COMPONENTS || !in.read(on)) return 0;
+    const std::lock_guard lock(controlLock(&context));
     (context.*table)[parameter.componentId] = on != 0 ? 1 : 0;
     UpdateComponentEnable(handle, parameter.componentId);
     UpdateDisableInputOutputGains(handle);
-    return in.position();
+    return static_cast<uint32_t>(in.position());
 }
 
 uint32_t setComponentOnISST(VXHandle handle, const Parameter &parameter) {
     const uint32_t read = setComponentByte(handle, parameter, &LibraryContext::componentOnISST);
     const LibraryContext &context = contextOf(handle);
-    return context.hostType == 3 && context.isstLoaded == 0 ? 0 : read;
+    return context.hostType == 3 && !isstInUse(context) ? 0 : read;
 }
 
 uint32_t setHardwareMode(LibraryContext &context, const Parameter &parameter) {
-    DataReader in(parameter);
+    ByteReader in = readerOf(parameter);
     uint32_t mode = 0;
     if (!in.read(mode)) return 0;
-    if (mode == context.hardwareMode) return in.position();
-    context.hardwareMode = mode;
+    const std::lock_guard lock(controlLock(&context));
+    if (mode == context.hardwareMode) return static_cast<uint32_t>(in.position());
+    storeShared(context.hardwareMode, mode);
     if (context.hostType >= 2 && context.hostType <= 4) {
         constexpr uint32_t kModuleWanted = 1;
         const ProcessHold hold(context);
-        if (context.isstLoaded != 0) UnloadISSTModule(context);
+        if (isstInUse(context)) UnloadISSTModule(context);
         if ((mode & kModuleWanted) != 0) LoadISSTModule(context);
     }
-    return in.position();
+    return static_cast<uint32_t>(in.position());
 }
 
 uint32_t setSingleChannelPinkNoise(LibraryContext &context, const Parameter &parameter) {
-    DataReader in(parameter);
+    ByteReader in = readerOf(parameter);
     uint8_t on = 0;
     if (!in.read(on)) return 0;
     const std::lock_guard lock(controlLock(&context));
@@ -106,7 +81,7 @@ uint32_t setSingleChannelPinkNoise(LibraryContext &context, const Parameter &par
     context.singleChannelPinkNoise = on != 0 ? 1 : 0;
     context.processFirResetPending = 1;
     context.processStop = 0;
-    return in.position();
+    return static_cast<uint32_t>(in.position());
 }
 
 // One of the five filters with everything that belongs to it.
@@ -120,12 +95,12 @@ struct FirPlace {
 };
 
 // A change of length keeps the block function off the filter; one of equal length is taken up between two blocks.
-void loadFir(LibraryContext &context, const FirPlace &place, DataReader &in, uint32_t count) {
+void loadFir(LibraryContext &context, const FirPlace &place, ByteReader &in, uint32_t count) {
     const std::lock_guard lock(controlLock(&context));
     const bool lengthChanges = count != place.length;
     if (lengthChanges) stopBlocks(place.filterBusy, place.blockBusy);
     place.length = count;
-    in.readFloats(place.coefficients, count);
+    in.readAll(place.coefficients, count);
     place.filter.load(place.coefficients, static_cast<int>(count), context.sampleRate);
     if (lengthChanges) {
         place.resetPending.store(1, std::memory_order_release);
@@ -134,48 +109,48 @@ void loadFir(LibraryContext &context, const FirPlace &place, DataReader &in, uin
 }
 
 uint32_t loadProcessFir(LibraryContext &context, const Parameter &parameter) {
-    DataReader in(parameter);
+    ByteReader in = readerOf(parameter);
     uint16_t count = 0;
-    if (!in.read(count) || count > VX_MAX_FIR_TAPS || !in.holdsFloats(count)) return 0;
+    if (!in.read(count) || count > VX_MAX_FIR_TAPS || !in.holds(count * sizeof(float))) return 0;
     loadFir(context,
             {context.processFir, context.processFirLength, context.processFirCoefficients, context.processFirBusy,
              context.processBusy, context.processFirResetPending},
             in, count);
-    return in.position();
+    return static_cast<uint32_t>(in.position());
 }
 
 uint32_t loadRecordFir(LibraryContext &context, const Parameter &parameter) {
-    DataReader in(parameter);
+    ByteReader in = readerOf(parameter);
     uint16_t count = 0;
     uint16_t channel = 0;
     if (!in.read(count)) return 0;
     const bool channelGiven = in.size() > count * sizeof(float) + sizeof count;
     if (channelGiven && !in.read(channel)) return 0;
-    if (count > VX_MAX_FIR_TAPS || channel >= VX_RECORD_CHANNELS || !in.holdsFloats(count)) return 0;
+    if (count > VX_MAX_FIR_TAPS || channel >= VX_RECORD_CHANNELS || !in.holds(count * sizeof(float))) return 0;
     loadFir(context,
             {context.recordFir[channel], context.recordFirLength[channel], context.recordFirCoefficients[channel],
              context.recordFirBusy[channel], context.recordBusy, context.recordFirResetPending},
             in, count);
-    return in.position();
+    return static_cast<uint32_t>(in.position());
 }
 
 uint32_t setProcessFirEnable(LibraryContext &context, const Parameter &parameter) {
-    DataReader in(parameter);
+    ByteReader in = readerOf(parameter);
     uint8_t on = 0;
     if (!in.read(on)) return 0;
     context.processFirEnable = on != 0 ? 1 : 0;
-    return in.position();
+    return static_cast<uint32_t>(in.position());
 }
 
 uint32_t setRecordFirEnable(LibraryContext &context, const Parameter &parameter) {
-    DataReader in(parameter);
+    ByteReader in = readerOf(parameter);
     uint8_t on = 0;
     uint16_t channel = 0;
     if (!in.read(on)) return 0;
     if (in.size() >= 2 && !in.read(channel)) return 0;
     if (channel >= VX_RECORD_CHANNELS) return 0;
     context.recordFirEnable[channel] = on != 0 ? 1 : 0;
-    return in.position();
+    return static_cast<uint32_t>(in.position());
 }
 
 uint32_t sendToEngines(VXHandle handle, const Parameter &p) {
@@ -184,7 +159,8 @@ uint32_t sendToEngines(VXHandle handle, const Parameter &p) {
     if (context.engineSetParameter != nullptr) {
         result = context.engineSetParameter(handle, p.componentId, p.paramId, p.channel, p.data, p.dataSize);
     }
-    if (context.isstLoaded != 0 && context.isstModule->engineSetParameter != nullptr) {
+    const std::lock_guard lock(controlLock(&context));
+    if (isstInUse(context) && context.isstModule->engineSetParameter != nullptr) {
         result =
             context.isstModule->engineSetParameter(context.isstHandle, p.componentId, p.paramId, p.channel, p.data, p.dataSize);
     }
