@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: MIT
 //
-// fir_bench: how fast FftFirFilter::process is on blocks of 512 samples, beside overlap-add of the same size made with FFTW in double
-// precision (complex, and real) and beside the plain form, which is the filter's own with a hook set.
+// fir_bench: how fast FftFirFilter::process is on blocks of 512 samples, beside overlap-add of the same size made with FFTW in
+// double precision (complex, and real) and beside the plain form of the tests.
 //
 // All contenders take turns within each round, so that a change of clock or load meets all of them; a figure is the median over the
 // rounds, a ratio the median of the rounds' ratios.
@@ -17,6 +17,7 @@
 #include <vector>
 
 #include "measure/fir_kernels.h"
+#include "tests/measure/plain_fir.h"
 #include "vxcomn/measurement_records.h"
 
 namespace {
@@ -38,7 +39,9 @@ struct FftwArray {
     T *values;
 };
 
-fftw_complex *raw(Complex *values) { return reinterpret_cast<fftw_complex *>(values); }
+fftw_complex *raw(Complex *values) {
+    return reinterpret_cast<fftw_complex *>(values);
+}
 
 // Overlap-add with a complex transform, in place.
 class ComplexPeer {
@@ -185,8 +188,6 @@ struct Filter : FftFirFilter {
     Filter &operator=(const Filter &) = delete;
 };
 
-void ignoreHook(double *, void *) {}
-
 void measure(int tapCount) {
     std::mt19937 random(1);
     std::uniform_real_distribution<float> uniform(-1.0f, 1.0f);
@@ -200,14 +201,13 @@ void measure(int tapCount) {
     while (size < 2 * tapCount) size *= 2;
     ComplexPeer complexPeer(taps, size);
     RealPeer realPeer(taps, size);
-    Filter plain;
-    plain.load(taps.data(), tapCount, 48000);
-    plain.beforeTransform = ignoreHook;
+    plain::Fir plainForm;
+    plainForm.load(taps);
 
     std::vector<Contender> contenders;
     contenders.push_back({"fftw c2c", [&](float *to) { complexPeer.process(in.data(), to, kBlock); }, 1, {}});
     contenders.push_back({"fftw r2c", [&](float *to) { realPeer.process(in.data(), to, kBlock); }, 1, {}});
-    contenders.push_back({"plain", [&](float *to) { plain.process(in.data(), to, kBlock); }, 1, {}});
+    contenders.push_back({"plain", [&](float *to) { plainForm.process(in.data(), to, kBlock); }, 1, {}});
     Filter filters[vxcomn::kInstructionSets];
     for (int i = 0; i <= static_cast<int>(vxcomn::bestInstructionSet()); ++i) {
         const auto set = static_cast<vxcomn::InstructionSet>(i);
