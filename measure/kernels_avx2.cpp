@@ -6,6 +6,7 @@
 #include <immintrin.h>
 
 #include "measure/level_lanes.h"
+#include "measure/notch_lanes.h"
 #include "measure/source_lanes.h"
 #include "measure/transform_lanes.h"
 
@@ -43,6 +44,7 @@ struct Wave {
     VXCOMN_RT_INLINE static Doubles load(const double *from) { return _mm256_loadu_pd(from); }
     VXCOMN_RT_INLINE static void store(double *to, Doubles value) { _mm256_storeu_pd(to, value); }
     VXCOMN_RT_INLINE static void storeRounded(float *to, Doubles value) { _mm_storeu_ps(to, _mm256_cvtpd_ps(value)); }
+    VXCOMN_RT_INLINE static Doubles roundedToFloat(Doubles value) { return _mm256_cvtps_pd(_mm256_cvtpd_ps(value)); }
     VXCOMN_RT_INLINE static bool all(Integers mask) { return _mm256_movemask_pd(__builtin_bit_cast(__m256d, mask)) == 15; }
 };
 
@@ -70,12 +72,16 @@ VXCOMN_RT void sweep(SweepRun &run, float *samples, int count) {
     sweepBlock<Wave>(run, samples, count);
 }
 
+VXCOMN_RT void notch(SweepRun &run, double rate, int count, NotchPiece &piece) {
+    notchInLanes<Wave>(run, rate, count, piece);
+}
+
 void spectrum(const SpectrumJob &job) {
     spectrumInLanes<Level>(job);
 }
 
 }  // namespace
 
-constinit const MeasureKernels kMeasureKernelsAvx2 = {peaks, anyAbove, mean, copy, sine, sweep, spectrum};
+constinit const MeasureKernels kMeasureKernelsAvx2 = {peaks, anyAbove, mean, copy, sine, sweep, notch, spectrum};
 
 }  // namespace vxcomn

@@ -6,6 +6,7 @@
 #include <immintrin.h>
 
 #include "measure/level_lanes.h"
+#include "measure/notch_lanes.h"
 #include "measure/source_lanes.h"
 #include "measure/transform_lanes.h"
 
@@ -39,6 +40,7 @@ struct Wave {
     VXCOMN_RT_INLINE static Doubles load(const double *from) { return _mm512_loadu_pd(from); }
     VXCOMN_RT_INLINE static void store(double *to, Doubles value) { _mm512_storeu_pd(to, value); }
     VXCOMN_RT_INLINE static void storeRounded(float *to, Doubles value) { _mm256_storeu_ps(to, _mm512_cvtpd_ps(value)); }
+    VXCOMN_RT_INLINE static Doubles roundedToFloat(Doubles value) { return _mm512_cvtps_pd(_mm512_cvtpd_ps(value)); }
     VXCOMN_RT_INLINE static bool all(Integers mask) { return _mm512_movepi64_mask(__builtin_bit_cast(__m512i, mask)) == 255; }
 };
 
@@ -66,12 +68,16 @@ VXCOMN_RT void sweep(SweepRun &run, float *samples, int count) {
     sweepBlock<Wave>(run, samples, count);
 }
 
+VXCOMN_RT void notch(SweepRun &run, double rate, int count, NotchPiece &piece) {
+    notchInLanes<Wave>(run, rate, count, piece);
+}
+
 void spectrum(const SpectrumJob &job) {
     spectrumInLanes<Level>(job);
 }
 
 }  // namespace
 
-constinit const MeasureKernels kMeasureKernelsAvx512 = {peaks, anyAbove, mean, copy, sine, sweep, spectrum};
+constinit const MeasureKernels kMeasureKernelsAvx512 = {peaks, anyAbove, mean, copy, sine, sweep, notch, spectrum};
 
 }  // namespace vxcomn

@@ -6,6 +6,7 @@
 #include <immintrin.h>
 
 #include "measure/level_lanes.h"
+#include "measure/notch_lanes.h"
 #include "measure/source_lanes.h"
 #include "measure/transform_lanes.h"
 
@@ -40,6 +41,7 @@ struct Wave {
     VXCOMN_RT_INLINE static void storeRounded(float *to, Doubles value) {
         _mm_storel_pi(reinterpret_cast<__m64 *>(to), _mm_cvtpd_ps(value));
     }
+    VXCOMN_RT_INLINE static Doubles roundedToFloat(Doubles value) { return _mm_cvtps_pd(_mm_cvtpd_ps(value)); }
     VXCOMN_RT_INLINE static bool all(Integers mask) { return _mm_movemask_pd(__builtin_bit_cast(__m128d, mask)) == 3; }
 };
 
@@ -67,12 +69,16 @@ VXCOMN_RT void sweep(SweepRun &run, float *samples, int count) {
     sweepBlock<Wave>(run, samples, count);
 }
 
+VXCOMN_RT void notch(SweepRun &run, double rate, int count, NotchPiece &piece) {
+    notchInLanes<Wave>(run, rate, count, piece);
+}
+
 void spectrum(const SpectrumJob &job) {
     spectrumInLanes<Level>(job);
 }
 
 }  // namespace
 
-constinit const MeasureKernels kMeasureKernelsSse2 = {peaks, anyAbove, mean, copy, sine, sweep, spectrum};
+constinit const MeasureKernels kMeasureKernelsSse2 = {peaks, anyAbove, mean, copy, sine, sweep, notch, spectrum};
 
 }  // namespace vxcomn

@@ -12,7 +12,7 @@ namespace vxcomn {
 namespace {
 
 VXCOMN_RT_INLINE float magnitudeOf(float x) {
-    return x < 0.0F ? -x : x;
+    return __builtin_fabsf(x);
 }
 
 // Four accumulators hide the latency of the maximum.

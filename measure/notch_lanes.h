@@ -7,7 +7,9 @@
 
 #include <cstdint>
 
+#include "measure/kernels.h"
 #include "measure/realtime.h"
+#include "measure/source_lanes.h"
 
 namespace vxcomn {
 namespace {
@@ -65,6 +67,23 @@ VXCOMN_RT_INLINE NotchCoefficients<D> notchAt(D hz, double rate) {
     const D alpha = sinW / 4.0;
     const D g = 1.0 / (1.0 + alpha);
     return {g, -2.0 * cosW * g, (1.0 - alpha) * g};
+}
+
+template <class L>
+VXCOMN_RT_INLINE void notchInLanes(SweepRun &run, double rate, int count, NotchPiece &piece) {
+    using D = typename L::Doubles;
+    using I = typename L::Integers;
+    double hz[kNotchPiece + 8] = {};
+    hz[0] = run.hz;
+    sweepPiece<L>(run, hz + 1, count);
+    for (int i = 0; i < count; i += L::kLanes) {
+        const auto at = notchAt<D, I>(L::roundedToFloat(L::load(hz + i)), rate);
+        L::storeRounded(piece.gain + i, at.gain);
+        L::storeRounded(piece.feedback + i, at.feedback);
+        L::storeRounded(piece.a2 + i, at.a2);
+        const D behind = L::load(hz + 1 + i);
+        L::store(piece.turn + i, behind * run.radiansPerHz);
+    }
 }
 
 }  // namespace
