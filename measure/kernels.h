@@ -25,13 +25,14 @@ struct SweepRun {
     double hz;  // frequency of the last sample
 };
 
-// What the tracking notch works with, at most so many samples at a time.
+// What the tracking notch works with, at most kNotchPiece samples at a time. The coefficients of a sample belong to the frequency
+// in front of it, so there is one more than samples: the last ones are for the sample behind the piece.
 inline constexpr int kNotchPiece = 64;
 struct NotchPiece {
-    float gain[kNotchPiece];      // b0 and b2
-    float feedback[kNotchPiece];  // b1 and a1
-    float a2[kNotchPiece];
-    double turn[kNotchPiece];  // radians that the sweep's phase moves on
+    alignas(64) float gain[kNotchPiece + 16];      // b0 and b2
+    alignas(64) float feedback[kNotchPiece + 16];  // b1 and a1
+    alignas(64) float a2[kNotchPiece + 16];
+    alignas(64) double turn[kNotchPiece];  // radians that the sweep's phase moves on
 };
 
 // The twiddles of one stage of the analyser's transform, real and imaginary parts apart.
@@ -66,8 +67,8 @@ struct MeasureKernels {
     double (*sine)(double phase, double step, float *samples, int count);
     // At least one sample of a sweep.
     void (*sweep)(SweepRun &run, float *samples, int count);
-    // The notch's coefficients for each of `count` samples of a sweep that moves on meanwhile: those of a sample belong to the
-    // frequency in front of it. rate: Hz. The phase is left to the caller, who adds the turns up.
+    // Moves a sweep on by `count` samples and fills the notch's coefficients from place 1 on, and the turns. rate: Hz. The phase is
+    // left to the caller, who adds the turns up.
     void (*notch)(SweepRun &run, double rate, int count, NotchPiece &piece);
     // Clamp, window, transform and power. [control]
     void (*spectrum)(const SpectrumJob &job);

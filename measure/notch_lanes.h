@@ -73,16 +73,15 @@ template <class L>
 VXCOMN_RT_INLINE void notchInLanes(SweepRun &run, double rate, int count, NotchPiece &piece) {
     using D = typename L::Doubles;
     using I = typename L::Integers;
-    double hz[kNotchPiece + 8] = {};
-    hz[0] = run.hz;
-    sweepPiece<L>(run, hz + 1, count);
+    alignas(64) double steps[kNotchPiece] = {};
+    sweepPiece<L>(run, steps, count);
     for (int i = 0; i < count; i += L::kLanes) {
-        const auto at = notchAt<D, I>(L::roundedToFloat(L::load(hz + i)), rate);
-        L::storeRounded(piece.gain + i, at.gain);
-        L::storeRounded(piece.feedback + i, at.feedback);
-        L::storeRounded(piece.a2 + i, at.a2);
-        const D behind = L::load(hz + 1 + i);
-        L::store(piece.turn + i, behind * run.radiansPerHz);
+        const D hz = L::load(steps + i);
+        L::store(piece.turn + i, hz * run.radiansPerHz);
+        const auto at = notchAt<D, I>(L::roundedToFloat(hz), rate);
+        L::storeRounded(piece.gain + 1 + i, at.gain);
+        L::storeRounded(piece.feedback + 1 + i, at.feedback);
+        L::storeRounded(piece.a2 + 1 + i, at.a2);
     }
 }
 

@@ -30,7 +30,7 @@ VXCOMN_RT_INLINE void sinesOfPiece(double *phases, float *samples, int count) {
 // Returns the phase behind the block.
 template <class L>
 VXCOMN_RT_INLINE double sineBlock(double phase, double step, float *samples, int count) {
-    double phases[kPiece];
+    alignas(64) double phases[kPiece];
     for (int done = 0; done < count; done += kPiece) {
         const int piece = count - done < kPiece ? count - done : kPiece;
         for (int i = 0; i < piece; ++i) {
@@ -78,7 +78,8 @@ VXCOMN_RT_INLINE void sweepPiece(SweepRun &run, double *hz, int count) {
 template <class L>
 VXCOMN_RT_INLINE void sweepBlock(SweepRun &run, float *samples, int count) {
     using D = typename L::Doubles;
-    double steps[kPiece] = {}, phases[kPiece];
+    alignas(64) double steps[kPiece] = {};
+    alignas(64) double phases[kPiece];
     double phase = run.phase;
     for (int done = 0; done < count; done += kPiece) {
         const int piece = count - done < kPiece ? count - done : kPiece;

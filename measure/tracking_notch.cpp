@@ -5,6 +5,7 @@
 
 #include "measure/biquad_step.h"
 #include "measure/kernels.h"
+#include "measure/notch_lanes.h"
 #include "measure/realtime.h"
 
 namespace vxcomn {
@@ -56,14 +57,13 @@ VXCOMN_RT_INLINE bool bandPassed(const DistortionLog &log, double position) {
     return log.next >= 0 && log.next < log.points && log.next < VX_MAX_DISTORTION && log.next < static_cast<int>(position);
 }
 
-// One piece, which lies behind the lead-in (`sounding`) or within it.
-VXCOMN_RT void trackPiece(SweepGenerator &tracker, BiquadState &notch, DistortionLog &log, float *samples, int count, double rate) {
-    const bool sounding = tracker.Position >= tracker.PreDelaySamples;
-    SweepRun run{tracker.Table, tracker.TablePosition, tracker.TableStep,       tracker.TableSize - 2.0,
-                 tracker.Phase, tracker.RadiansPerHz,  tracker.CurrentFrequency};
-    NotchPiece piece;
+// One piece, which lies behind the lead-in (`sounding`) or within it. Place 0 of the coefficients is filled, before and after.
+VXCOMN_RT void trackPiece(SweepGenerator &tracker, BiquadState &notch, DistortionLog &log, float *samples, int count, double rate,
+                          NotchPiece &piece) {
     Sums sums{log.inputSum, log.outputSum, tracker.Phase};
-    if (sounding) {
+    if (tracker.Position >= tracker.PreDelaySamples) {
+        SweepRun run{tracker.Table, tracker.TablePosition, tracker.TableStep,       tracker.TableSize - 2.0,
+                     tracker.Phase, tracker.RadiansPerHz,  tracker.CurrentFrequency};
         measureKernels->notch(run, rate, count, piece);
         filterPiece(notch, piece, samples, count, sums);
         log.inputSum = sums.input;
@@ -72,15 +72,17 @@ VXCOMN_RT void trackPiece(SweepGenerator &tracker, BiquadState &notch, Distortio
         tracker.CurrentFrequency = run.hz;
     } else {
         // In the lead-in the frequency stands still, and nothing but the sample before its end counts: behind the notch only.
-        measureKernels->notch(run, rate, 1, piece);
-        for (int i = 1; i < count; ++i) {
-            piece.gain[i] = piece.gain[0];
-            piece.feedback[i] = piece.feedback[0];
-            piece.a2[i] = piece.a2[0];
+        for (int i = 0; i < count; ++i) {
+            piece.gain[i + 1] = piece.gain[0];
+            piece.feedback[i + 1] = piece.feedback[0];
+            piece.a2[i + 1] = piece.a2[0];
+            piece.turn[i] = 0.0;
         }
-        for (int i = 0; i < count; ++i) piece.turn[i] = 0.0;
         filterPiece(notch, piece, samples, count, sums);
     }
+    piece.gain[0] = piece.gain[count];
+    piece.feedback[0] = piece.feedback[count];
+    piece.a2[0] = piece.a2[count];
     tracker.Position += count;
     if (tracker.Position >= tracker.PreDelaySamples) log.outputSum = sums.output;
 }
@@ -106,15 +108,20 @@ VXCOMN_RT void trackSweep(SweepGenerator &tracker, BiquadState &notch, Distortio
     const unsigned mode = _mm_getcsr();
     _mm_setcsr(mode | kBlockMode);
     const auto hz = static_cast<double>(static_cast<float>(rate));
+    NotchPiece piece;
+    const auto first = notchAt<double, int64_t>(static_cast<double>(static_cast<float>(tracker.CurrentFrequency)), hz);
+    piece.gain[0] = static_cast<float>(first.gain);
+    piece.feedback[0] = static_cast<float>(first.feedback);
+    piece.a2[0] = static_cast<float>(first.a2);
     for (int done = 0; done < count;) {
         // Where a band may end inside the piece, it goes sample by sample. The table position moves one way, so its last value
         // tells.
-        int piece = evenPiece(tracker, count - done);
-        double last = tracker.TablePosition + 0x1p-20 + (tracker.TableStep > 0.0 ? piece * tracker.TableStep : 0.0);
+        int length = evenPiece(tracker, count - done);
+        double last = tracker.TablePosition + 0x1p-20 + (tracker.TableStep > 0.0 ? length * tracker.TableStep : 0.0);
         if (last > tracker.TableSize) last = tracker.TableSize;
-        if (bandPassed(log, last)) piece = 1;
-        trackPiece(tracker, notch, log, samples + done, piece, hz);
-        done += piece;
+        if (bandPassed(log, last)) length = 1;
+        trackPiece(tracker, notch, log, samples + done, length, hz, piece);
+        done += length;
         if (bandPassed(log, tracker.TablePosition)) {
             log.ratios[log.next] = log.inputSum == 0.0 ? 1.0F : static_cast<float>(log.outputSum / log.inputSum);
             log.inputSum = 0.0;
