@@ -12,6 +12,10 @@
 #include "platform/clock.h"
 #include "platform/float_mode.h"
 
+#ifdef VXCOMN_RT_FAULT
+#include "tests/realtime/injected_fault.h"  // negative controls of the real-time proofs
+#endif
+
 namespace vxcomn {
 
 namespace {
@@ -123,6 +127,9 @@ VXCOMN_RT void VXDSPAPI_Process(VXHandle handle, ProcessBuffers *buffers, IOForm
     context.processBusy.store(1, std::memory_order_seq_cst);
     const int64_t start = performanceNanoseconds();
     const int frames = output->frames;
+#ifdef VXCOMN_RT_FAULT
+    injected_fault::VXCOMN_RT_FAULT();
+#endif
     processBlock(handle, {context, buffers, input, output, buffers->channels, heldToSlots(input->channels),
                           heldToSlots(output->channels), frames});
     storeShared(context.totalFrames, context.totalFrames + static_cast<uint64_t>(static_cast<int64_t>(frames)));
