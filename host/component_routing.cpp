@@ -21,16 +21,15 @@ void send(VXEngineSetParameter setParameter, VXEngineHandle handle, int32_t comp
     if (setParameter != nullptr) setParameter(handle, componentId, paramId, 0, &data, 1);
 }
 
-// Whether some enabled component still runs in the main engine.
-bool mainEngineHasWork(const LibraryContext &context) {
+}  // namespace
+
+bool mainEngineHasWork(const LibraryContext &context) noexcept {
     const int last = std::min<int>(context.maxComponentId, VX_MAX_COMPONENTS - 1);
     for (int id = 0; id <= last; ++id) {
         if (context.componentEnable[id] != 0 && context.componentOnISST[id] == 0) return true;
     }
     return false;
 }
-
-}  // namespace
 
 void UpdateComponentEnable(VXEngineHandle handle, int32_t componentId) {
     const LibraryContext &context = contextOf(handle);

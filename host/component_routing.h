@@ -14,4 +14,7 @@ void UpdateComponentEnable(VXEngineHandle handle, int32_t componentId);
 // Tells both engines which gains they leave out.
 void UpdateDisableInputOutputGains(VXEngineHandle handle);
 
+// Whether some enabled component still runs in the main engine. [control, under controlLock]
+bool mainEngineHasWork(const LibraryContext &context) noexcept;
+
 }  // namespace vxcomn

@@ -48,7 +48,44 @@ class ProcessHold {
     LibraryContext &context_;
 };
 
-// Keeps both block functions out for a scope: capture first, then render, and released in the same order.
+// Keeps one block function off a group of fields for a scope: it goes on, and leaves out what the byte stands for.
+class FieldHold {
+  public:
+    FieldHold(LibraryContext &context, VXAtomicByte &byte, const VXAtomicByte &busy) noexcept
+        : lock_(controlLock(&context)), byte_(byte) {
+        stopBlocks(byte, busy);
+    }
+    ~FieldHold() { byte_.store(0, std::memory_order_release); }
+    FieldHold(const FieldHold &) = delete;
+    FieldHold &operator=(const FieldHold &) = delete;
+
+  private:
+    std::lock_guard<std::recursive_mutex> lock_;
+    VXAtomicByte &byte_;
+};
+
+// Keeps both block functions out for a scope, as the measuring commands do: render first, then capture, and released in the same
+// order.
+class MeasuringHold {
+  public:
+    explicit MeasuringHold(LibraryContext &context) noexcept : lock_(controlLock(&context)), context_(context) {
+        stopBlocks(context.processStop, context.processBusy);
+        stopBlocks(context.recordStop, context.recordBusy);
+    }
+    ~MeasuringHold() {
+        context_.processStop.store(0, std::memory_order_release);
+        context_.recordStop.store(0, std::memory_order_release);
+    }
+    MeasuringHold(const MeasuringHold &) = delete;
+    MeasuringHold &operator=(const MeasuringHold &) = delete;
+
+  private:
+    std::lock_guard<std::recursive_mutex> lock_;
+    LibraryContext &context_;
+};
+
+// Keeps both block functions out for a scope, as the component calls do: capture first, then render, and released in the same
+// order.
 class BlockHold {
   public:
     explicit BlockHold(LibraryContext &context) noexcept : lock_(controlLock(&context)), context_(context) {

@@ -132,6 +132,94 @@ VXCOMN_API uint32_t VXDSPAPI_SetParameterEx(VXHandle handle, int32_t componentId
                                             uint32_t dataSize, int32_t transient);
 
 /*
+ * The commands of VXDSPAPI_ReadWriteData that are the host's own. Streams are packed, little-endian, without header or alignment;
+ * "in" is what the command reads of its input, "out" what it writes. Channels are 0 to 7, analysers 0 (engine input), 1 (engine
+ * output), 2 (capture). Peaks and spectra are linear.
+ */
+enum VXDspData {
+    /* Meters: largest magnitude of each channel since the last read. out: i32 count, count x f32. Reading empties the meter. */
+    VXDSP_DATA_METER_RECORD = -1, /* the capture side, behind its filters and measurements; at most 4 channels */
+    VXDSP_DATA_METER_INPUT = -2,  /* ahead of the engine */
+    VXDSP_DATA_METER_OUTPUT = -3, /* behind the engine */
+
+    /* in: u8 analyser, u8 on. Switches a feed; off also clears what the analyser holds. Analysers come up off after each format. */
+    VXDSP_DATA_RTA_ENABLE = -7,
+    /* in: u8 choice. What analysers 1 and 2 listen to: channel 0, channel 1, or the mean of all from 2 on. */
+    VXDSP_DATA_RTA_CHANNEL = -8,
+    /*
+     * in: u8 analyser, u8 ignored, u8 integrate, u32 fftSize, i32 bandsPerOctave; the last three as for VXDSPAPI_RTA_CalcSpectrum.
+     * out: u64 address of the bands, u8 0. Analyses the newest fftSize / 2 samples; fftSize is a power of two, at most twice the
+     * rate. The bands are the analyser's own f32 values, one less than the table has edges; the next readout overwrites them. One
+     * reader for each analyser.
+     */
+    VXDSP_DATA_RTA_READ = -9,
+
+    /* Share of real time, in percent, that a block function took. out: f32. Worked out anew after a quarter of a second of audio.
+     */
+    VXDSP_DATA_LOAD_PROCESS = -10,
+    VXDSP_DATA_LOAD_RECORD = -11,
+
+    /* in: i32, i32. Reads both and does nothing with them. */
+    VXDSP_DATA_IGNORED_PAIR = -12,
+
+    /* Test signals on all channels, ahead of the engine. in: u8 on. White noise goes before pink, pink before the sine. */
+    VXDSP_DATA_WHITE_NOISE = -13, /* between 0 and 2, with a mean of 1 */
+    VXDSP_DATA_PINK_NOISE = -14,
+    /* in: u8 on, u16 frequency in Hz, 0 for what is set. A sine of full scale, on the first four channels. */
+    VXDSP_DATA_SINE = -15,
+
+    /*
+     * in: u8 on, u8 channel, u16 start, u16 stop (Hz), u16 sweepTime, u16 preDelay, u16 postDelay (ms), u16 bandsPerOctave. Arms
+     * one channel's sweep, which measures distortion by itself while blocks run on both sides, or stops it. Start has to be above 0
+     * and below stop, and sweepTime above 0, also to stop. The search for the sweep on the capture side wants more than sixfold
+     * growth within 10 ms: on a clean chain it finds lead-in tones of a half length below about 64 ms, which is a preDelay below
+     * about 128 ms.
+     */
+    VXDSP_DATA_SWEEP_START = -17,
+    /*
+     * in: u8 n, then n times: u8 ring, u8 k, k x u64 address of a sample buffer, u64 address of k u8 flags, u8 oneShot. Programs
+     * the rings of capture channels 0 to 3; a ring from 4 on, or a k from 8 on, ends the list. Buffers and flags are the caller's
+     * until VXDSP_DATA_CAPTURE_STOP.
+     */
+    VXDSP_DATA_CAPTURE_ARM = -18,
+    /* Forgets the capture rings. */
+    VXDSP_DATA_CAPTURE_STOP = -19,
+    /*
+     * in: u8 channel. out: i32 points, i32 index, u64 address. The sweep's results so far: f32 ratios of what is not the
+     * fundamental, one a band of the table, of which those below index are final, and those from the sweep's first band on
+     * measured; 1.0 stands for "not measured". A sweep that has come to its end leaves index at points - 1.
+     */
+    VXDSP_DATA_SWEEP_RESULT = -20,
+
+    /* in: u8 on, u8 channel, u8 ignored, u16 halfLength in ms. Plays one channel's polarity tone and listens for it. */
+    VXDSP_DATA_POLARITY_START = -21,
+    /* in: u8 channel. out: i32, -1 for a chain that keeps the polarity, +1 for one that inverts it, 0 while it is unknown. */
+    VXDSP_DATA_POLARITY_RESULT = -22,
+
+    /* out: u8, nonzero while the iSST module is in use. */
+    VXDSP_DATA_ISST_LOADED = -26,
+    /* Versions: out: u64 of four 16-bit parts, major highest. */
+    VXDSP_DATA_MODULE_VERSION = -27, /* of this library */
+    VXDSP_DATA_APO_VERSION = -28,    /* of the installed copy */
+    /* out: u8. 0: no iSST module; 1: some enabled component runs in the main engine; 2: all enabled ones run on the module. */
+    VXDSP_DATA_ISST_STATE = -29
+};
+
+/*
+ * Runs a diagnostic command, or exchanges data with the engines. The ids of VXDspData are the host's; all others, which are those
+ * from 0 on, those below -29, and -4, -5, -6, -16, -23, -24 and -25, go to the engine and then to the iSST module, if it is loaded.
+ * componentId: the engine's; the host's commands do not look at it. input: inputSize bytes, or null for none. output: room for all
+ * that the command writes, at most 36 bytes for the host's own; may be null for commands that write nothing. Addresses in the
+ * streams are those of this process.
+ * Returns the bytes written to output, or the engine's result, of which the module's goes last.
+ * A command of the host's returns 0 and changes nothing if its input is shorter than what it reads, if a channel or analyser number
+ * is too high, if an fftSize is no power of two or more than twice the rate, if memory is short, and if a sweep's values are none.
+ * [control] May come while blocks run, from several threads.
+ */
+VXCOMN_API uint32_t VXDSPAPI_ReadWriteData(VXHandle handle, uint32_t componentId, int32_t paramId, const uint8_t *input,
+                                           int32_t inputSize, uint8_t *output);
+
+/*
  * Turns a power spectrum of the caller's into fractional-octave bands. Needs no handle.
  * power: fftSize / 2 + 1 linear values, from 0 Hz to half of sampleRate (Hz). bandsPerOctave: 3, 6, 12, 24, 48, or -24 for 24 bands
  * shifted by a quarter octave; any other number means 1. integrate: nonzero for the power between a band's edges, 0 for the value
