@@ -9,7 +9,8 @@
 #include "platform/system_folder.h"
 #include "preset/endpoint_class.h"
 #include "preset/endpoint_id.h"
-#include "preset/preset_paths.h"
+#include "preset/package_discovery.h"
+#include "preset/preset_names.h"
 #include "tests/preset/recording.h"
 
 using namespace vxcomn;

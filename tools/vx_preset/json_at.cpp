@@ -11,6 +11,8 @@
 namespace vx::preset {
 namespace {
 
+constexpr int kDeepest = 32;
+
 int digitOf(char c) {
     if (c >= '0' && c <= '9') return c - '0';
     if (c >= 'a' && c <= 'f') return c - 'a' + 10;
@@ -28,8 +30,15 @@ std::string shown(const Json &value) {
 }  // namespace
 
 Json parseJson(const std::string &file, std::span<const uint8_t> text) {
+    // Documents that people write are a few levels deep; the JSON library's own walks are recursive.
+    const auto shallow = [&file](int depth, Json::parse_event_t, Json &) {
+        if (depth > kDeepest)
+            throw Failure(Exit::input,
+                          file + ": found lists in lists without end, expected at most " + std::to_string(kDeepest) + " levels");
+        return true;
+    };
     try {
-        return Json::parse(text.begin(), text.end());
+        return Json::parse(text.begin(), text.end(), shallow);
     } catch (const Json::parse_error &error) {
         const size_t at = std::min<size_t>(error.byte > 0 ? error.byte - 1 : 0, text.size());
         const auto line = 1 + std::count(text.begin(), text.begin() + static_cast<ptrdiff_t>(at), uint8_t{'\n'});

@@ -3,6 +3,7 @@
 
 #include <algorithm>
 
+#include "platform/text.h"
 #include "preset/zip_directory.h"
 #include "tools/vx_preset/failure.h"
 #include "tools/vx_preset/preset_json.h"
@@ -181,6 +182,8 @@ Json packageToJson(const std::string &file, const Archive &archive) {
     };
     if (archive.problem) refuse(archive.problem->offset, "\"" + archive.problem->what + "\"", "a sound zip directory");
     for (const ArchiveEntry &entry : archive.entries) {
+        if (toUtf8(toWide(entry.name)) != entry.name)
+            refuse(entry.headerOffset, "an entry name that is no UTF-8", "names in UTF-8");
         if (entry.method != 0) {
             refuse(entry.headerOffset, "entry '" + entry.name + "' compressed by method " + std::to_string(entry.method),
                    "stored entries, which alone are read (zip -0)");

@@ -6,7 +6,7 @@
 #include <memory>
 
 #include "platform/text.h"
-#include "preset/preset_paths.h"
+#include "preset/preset_names.h"
 #include "preset/preset_writer.h"
 #include "tools/vx_preset/check.h"
 #include "tools/vx_preset/compare.h"
@@ -160,6 +160,10 @@ CLI::App *addVerb(CLI::App &group, const std::shared_ptr<Options> &options, int 
         } catch (const Failure &failure) {
             std::cerr << "vx: " << failure.what() << '\n';
             exitStatus = static_cast<int>(failure.exit());
+        } catch (const std::filesystem::filesystem_error &error) {
+            std::cerr << "vx: " << error.path1().string() << ": cannot be read (" << error.code().message()
+                      << "); check its rights\n";
+            exitStatus = static_cast<int>(Exit::system);
         }
     });
     return command;

@@ -26,6 +26,7 @@ struct KnownParameter {
 constexpr KnownParameter kKnown[] = {
     {-1, -18, -18, Form::on, "bypass all"},
     {-1, -2, -2, Form::on, "power"},
+    {-1, -12, -12, Form::real, "output level"},
     {0, -12, -12, Form::real, "voice level"},
     {1, -12, -12, Form::real, "surround level"},
     {2, -12, -12, Form::real, "detail level"},
@@ -42,11 +43,15 @@ constexpr KnownParameter kKnown[] = {
     {5, 117, 126, Form::band, "EQ band"},
 };
 
+// A switch that every component has.
+constexpr int32_t kComponentOn = -6;
+constexpr KnownParameter kComponentSwitch = {0, kComponentOn, kComponentOn, Form::on, "component on"};
+
 const KnownParameter *find(int32_t componentId, int32_t paramId) {
     for (const KnownParameter &known : kKnown) {
         if (known.componentId == componentId && paramId >= known.first && paramId <= known.last) return &known;
     }
-    return nullptr;
+    return componentId >= 0 && paramId == kComponentOn ? &kComponentSwitch : nullptr;
 }
 
 // The shortest decimal that reads back as the same float; nothing for what JSON has no number for.

@@ -1,22 +1,12 @@
 // SPDX-License-Identifier: MIT
-#include "preset/preset_paths.h"
+#include "preset/package_discovery.h"
 
 #include "platform/file.h"
 #include "platform/system_folder.h"
+#include "preset/preset_names.h"
 
 namespace vxcomn {
 namespace {
-
-WideString join(const PresetKey &key, VXWCHAR separator) {
-    WideString path;
-    read_log::append(path, key.endpointIndex == -1 ? 0 : key.endpointIndex);
-    for (const WideString *part : {&key.apoType, &key.ioConfig, &key.contentType}) {
-        path += separator;
-        path += *part;
-    }
-    path += separator;
-    return path + VX_TEXT("Preset.bin");
-}
 
 // As PathAppendW does for ordinary components.
 WideString appended(WideString folder, const WideString &name) {
@@ -25,21 +15,6 @@ WideString appended(WideString folder, const WideString &name) {
 }
 
 }  // namespace
-
-WideString presetPackageName(const WideString &deviceId) {
-    WideString name = VX_TEXT("VXAPODATU.") + deviceId + VX_TEXT(".zip");
-    const size_t backslash = name.find(VX_TEXT('\\'));
-    if (backslash != WideString::npos) name[backslash] = VX_TEXT('.');
-    return name;
-}
-
-WideString packagePresetPath(const PresetKey &key) {
-    return join(key, VX_TEXT('/'));
-}
-
-WideString loosePresetPath(const PresetKey &key) {
-    return kLoosePresetRoot + join(key, VX_TEXT('\\'));
-}
 
 SystemFacts systemFacts() {
     return {windowsFolder(), nativeArchitecture(), runsUnderWow64()};

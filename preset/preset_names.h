@@ -7,7 +7,6 @@
 #include <cstdint>
 
 #include "platform/text.h"
-#include "preset/read_log.h"
 
 namespace vxcomn {
 
@@ -30,19 +29,5 @@ WideString packagePresetPath(const PresetKey &key);
 
 // The same with backslashes, below kLoosePresetRoot.
 WideString loosePresetPath(const PresetKey &key);
-
-// What chooses the folder of packages.
-struct SystemFacts {
-    WideString windowsFolder;
-    uint16_t nativeArchitecture = 0;
-    bool underWow64 = false;
-};
-SystemFacts systemFacts();
-
-// The system folder that packages and the installed module lie in.
-WideString packageFolder(const SystemFacts &facts);
-
-// The path of the device's package, or nothing if there is none.
-WideString findPresetPackage(const WideString &deviceId, const SystemFacts &facts, ReadLog *log);
 
 }  // namespace vxcomn
