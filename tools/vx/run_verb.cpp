@@ -1,0 +1,55 @@
+// SPDX-License-Identifier: MIT
+//
+// vx run: registers the verb and puts its pieces together.
+#include <iostream>
+#include <memory>
+
+#include "tools/vx/plot.h"
+#include "tools/vx/run_options.h"
+#include "tools/vx/run_report.h"
+#include "tools/vx/run_session.h"
+#include "tools/vx/verb.h"
+
+namespace vx {
+
+namespace {
+
+void run(const RunOptions &options) {
+    checkRunOptions(options);
+    std::unique_ptr<Plot> plot;
+    if (!options.plot.empty()) plot = std::make_unique<Plot>(options.plot, options.force);
+    const RunReport report = runSession(options);
+    std::vector<std::string> files;
+    if (!options.output.empty() && options.output != "-") files.push_back(options.output);
+    if (!options.levelsCsv.empty()) files.push_back(options.levelsCsv);
+    if (plot) {
+        const std::vector<std::string> made = plot->draw(loadTable(options, report), loadPlotCommands(options, report));
+        if (made.front() != plot->path()) std::cerr << "vx: gnuplot is not there; its script is " << made.front() << "\n";
+        files.insert(files.end(), made.begin(), made.end());
+    }
+    if (options.common.json) {
+        std::cout << runJson(options, report, files);
+        return;
+    }
+    if (options.common.quiet) {
+        if (options.digest) std::cout << digestText(report.digest) << "\n";
+        return;
+    }
+    // With the sound on standard output the summary must not get into it.
+    const bool soundOnOutput = options.output == "-";
+    std::ostream &out = soundOnOutput ? std::cerr : std::cout;
+    out << runText(options, report, Style(options.common.colour, soundOnOutput ? stderr : stdout));
+    for (const std::string &file : files)
+        out << "wrote    " << file << (file == options.output ? " (" + report.sampleText + ")" : "") << "\n";
+}
+
+}  // namespace
+
+void addRunVerb(CLI::App &app, int &) {
+    auto options = std::make_shared<RunOptions>();
+    CLI::App *verb = app.add_subcommand("run", "Play a sound file through an engine into a file, and measure the run");
+    addRunOptions(*verb, *options);
+    verb->callback([options] { run(*options); });
+}
+
+}  // namespace vx
