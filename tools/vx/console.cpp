@@ -17,8 +17,8 @@ constexpr int kAroundBar = 24;  // percent and time left
 
 std::string clockText(double seconds) {
     const auto whole = static_cast<long>(std::clamp(seconds, 0.0, 359999.0) + 0.5);
-    return whole >= 3600 ? format("%ld:%02ld:%02ld", whole / 3600, whole / 60 % 60, whole % 60)
-                         : format("%ld:%02ld", whole / 60, whole % 60);
+    return whole >= 3600 ? textf("%ld:%02ld:%02ld", whole / 3600, whole / 60 % 60, whole % 60)
+                         : textf("%ld:%02ld", whole / 60, whole % 60);
 }
 
 }  // namespace

@@ -49,9 +49,9 @@ void HostSession::failFormat(const char *side, const IOFormat &wanted, const IOF
         advice = "; it offers " + layoutText(offered.channelMask) + ": try " + option + layoutName(offered.channelMask);
     else if (offersOther)
         advice = "; it offers " + layoutText(offered.channelMask) +
-                 format(" at %d Hz: bring the file to that rate first", offered.sampleRate);
+                 textf(" at %d Hz: bring the file to that rate first", offered.sampleRate);
     throw Failure(ExitStatus::input, choice_.engine + ": does not take " + layoutText(wanted.channelMask) +
-                                         format(" at %d Hz as %s (its answer is %u)", wanted.sampleRate, side, answer) + advice);
+                                         textf(" at %d Hz as %s (its answer is %u)", wanted.sampleRate, side, answer) + advice);
 }
 
 void HostSession::start(IOFormat input, IOFormat output) {
@@ -68,7 +68,7 @@ void HostSession::start(IOFormat input, IOFormat output) {
     if (refused != 0)
         throw Failure(ExitStatus::input, choice_.engine + ": said yes to both formats and then refused to set " +
                                              layoutText(input.channelMask) + " to " + layoutText(output.channelMask) +
-                                             format(" at %d Hz (its answer is %u)", output.sampleRate, refused) +
+                                             textf(" at %d Hz (its answer is %u)", output.sampleRate, refused) +
                                              "; try another layout or --block");
     createComponents(output.sampleRate);
 }

@@ -88,7 +88,7 @@ void runJoin(const JoinOptions &options) {
     output.commit();
     if (!options.quiet && options.output != "-")
         std::cout << "wrote " << options.output << ": " << layoutText(mask) << ", " << format.sampleRate << " Hz, "
-                  << vx::format("%.2f s\n", static_cast<double>(frames) / format.sampleRate);
+                  << textf("%.2f s\n", static_cast<double>(frames) / format.sampleRate);
 }
 
 }  // namespace

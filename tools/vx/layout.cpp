@@ -72,12 +72,12 @@ uint32_t parseLayout(const std::string &text) {
 
 std::string layoutName(uint32_t mask) {
     const NamedLayout *layout = namedLayout(mask);
-    return layout != nullptr ? layout->name : format("0x%X", mask);
+    return layout != nullptr ? layout->name : textf("0x%X", mask);
 }
 
 std::string layoutText(uint32_t mask) {
     const NamedLayout *layout = namedLayout(mask);
-    return layout != nullptr ? format("%s (0x%X)", layout->name, mask) : format("speakers 0x%X", mask);
+    return layout != nullptr ? textf("%s (0x%X)", layout->name, mask) : textf("speakers 0x%X", mask);
 }
 
 uint32_t usualLayout(int channels) {

@@ -23,10 +23,10 @@ class LevelsCsv {
     }
 
     void add(uint64_t frame, const std::vector<float> &input, const std::vector<float> &output, double nanoseconds) {
-        std::string row = format("%.6f", static_cast<double>(frame) / sampleRate_);
-        for (const float peak : input) row += format(",%.9g", static_cast<double>(peak));
-        for (const float peak : output) row += format(",%.9g", static_cast<double>(peak));
-        file_.writeText(row + format(",%.3f\n", nanoseconds / 1000.0));
+        std::string row = textf("%.6f", static_cast<double>(frame) / sampleRate_);
+        for (const float peak : input) row += textf(",%.9g", static_cast<double>(peak));
+        for (const float peak : output) row += textf(",%.9g", static_cast<double>(peak));
+        file_.writeText(row + textf(",%.3f\n", nanoseconds / 1000.0));
     }
 
     void finish() { file_.commit(); }

@@ -28,7 +28,7 @@ struct LevelsOptions {
     CommonOptions common;
     std::string first;
     std::string second;
-    std::string plot;
+    std::vector<std::string> plots;
     bool force = false;
 };
 
@@ -61,7 +61,7 @@ Levels measure(const std::string &path, bool silent) {
 
 std::string levelText(double decibels) {
     if (std::isnan(decibels)) return "not measurable";
-    return std::isinf(decibels) ? "silent" : format("%.1f", decibels);
+    return std::isinf(decibels) ? "silent" : textf("%.1f", decibels);
 }
 
 // NaN where one side is silent or not measurable.
@@ -72,23 +72,23 @@ double changeOf(const Levels &before, const Levels &after, size_t band) {
 
 void printText(const Levels &before, const Levels *after, const Style &style) {
     const auto what = [](const Levels &levels) {
-        return format("%s: %d channel%s, %d Hz, %.2f s\n", levels.path.c_str(), levels.channels, levels.channels == 1 ? "" : "s",
-                      levels.sampleRate, static_cast<double>(levels.frames) / levels.sampleRate);
+        return textf("%s: %d channel%s, %d Hz, %.2f s\n", levels.path.c_str(), levels.channels, levels.channels == 1 ? "" : "s",
+                     levels.sampleRate, static_cast<double>(levels.frames) / levels.sampleRate);
     };
     std::string text = (after == nullptr ? "" : "before  ") + what(before);
     if (after != nullptr) text += "after   " + what(*after);
-    text += style.bold(after == nullptr ? format("%8s  %14s", "octave", "level in dB")
-                                        : format("%8s  %14s  %14s  %10s", "octave", "before in dB", "after in dB", "change"));
+    text += style.bold(after == nullptr ? textf("%8s  %14s", "octave", "level in dB")
+                                        : textf("%8s  %14s  %14s  %10s", "octave", "before in dB", "after in dB", "change"));
     text += "\n";
     for (size_t band = 0; band < before.decibels.size(); ++band) {
-        text += format("%5s Hz  %14s", kOctaveBand[band].name, levelText(before.decibels[band]).c_str());
+        text += textf("%5s Hz  %14s", kOctaveBand[band].name, levelText(before.decibels[band]).c_str());
         if (after != nullptr) {
             const double change = changeOf(before, *after, band);
-            const std::string number = std::isnan(change) ? "" : format("%+.1f", change);
-            const std::string cell = format("%10s", number.c_str());
-            text += format("  %14s  ", levelText(after->decibels[band]).c_str()) + (change >= 0.5    ? style.good(cell)
-                                                                                    : change <= -0.5 ? style.warning(cell)
-                                                                                                     : cell);
+            const std::string number = std::isnan(change) ? "" : textf("%+.1f", change);
+            const std::string cell = textf("%10s", number.c_str());
+            text += textf("  %14s  ", levelText(after->decibels[band]).c_str()) + (change >= 0.5    ? style.good(cell)
+                                                                                   : change <= -0.5 ? style.warning(cell)
+                                                                                                    : cell);
         }
         text += "\n";
     }
@@ -144,33 +144,37 @@ std::string fileName(const std::string &path) {
     return path == "-" ? "standard input" : utf8Of(pathOf(path).filename());
 }
 
+// Ticks of the frequency axis, with or without their names.
+std::string ticks(bool named) {
+    std::string text;
+    for (const OctaveBand &band : kOctaveBand)
+        text += (text.empty() ? "" : ", ") + textf("\"%s\" %g", named ? band.name : "", band.middleHz);
+    return "set xtics (" + text + ")\n";
+}
+
 std::string plotCommands(const Levels &before, const Levels *after) {
-    std::string tics;
-    for (const OctaveBand &band : kOctaveBand) tics += (tics.empty() ? "" : ", ") + format("\"%s\" %g", band.name, band.middleHz);
-    const std::string axis = "set logscale x 2\nset xrange [22:23000]\nset xtics (" + tics + ")\nset ylabel \"dB\"\n";
-    const std::string first = "\"" + gnuplotText(fileName(before.path)) + "\"";
-    const std::string lines = "$data using 1:2 with linespoints lw 2 pt 7 ps 0.8 lc rgb '#888888' title " + first + " noenhanced";
+    const std::string axis =
+        "set logscale x 2\nset xrange [22:23000]\nset title \"Level per octave band (0 dB: sine at full scale)\"\n";
+    const std::string lines = "$data using 1:2 with linespoints lw 2 pt 7 ps 0.8 lc rgb '#888888' title \"" +
+                              gnuplotText(fileName(before.path)) + "\" noenhanced";
     if (after == nullptr)
-        return axis +
-               "set key top right\nset title \"Level per octave band (0 dB: sine at full scale)\"\nset xlabel \"Hz\"\nplot " +
-               lines + "\n";
-    const std::string second = "\"" + gnuplotText(fileName(after->path)) + "\"";
-    return axis + "set multiplot\nset lmargin at screen 0.09\nset rmargin at screen 0.97\n" +
-           "set tmargin at screen 0.91\nset bmargin at screen 0.47\n" +
-           "set title \"Level per octave band (0 dB: sine at full scale)\"\nset key bottom center maxrows 1 noenhanced\nset format "
-           "x ''\nset offsets 0,0,2,10\n" +
-           "plot " + lines + ", $data using 1:3 with linespoints lw 2 pt 5 ps 0.8 lc rgb '#1f6fb4' title " + second +
-           " noenhanced\n" +
-           "set tmargin at screen 0.37\nset bmargin at screen 0.12\nset title \"Change\"\nunset key\nset format x '%g'\nset "
-           "offsets 0,0,2,2\n" +
-           "set xlabel \"Hz\" offset 0,0.3\nset xzeroaxis lt 1 lc rgb '#555555'\nset style fill solid 0.8 noborder\n" +
-           "plot $data using 1:4:($1*0.45) with boxes lc rgb '#1f6fb4', " +
+        return axis + ticks(true) + "set key top right\nset xlabel \"Hz\"\nset ylabel \"dB\"\nplot " + lines + "\n";
+    return axis + "set multiplot\nset lmargin at screen 0.1\nset rmargin at screen 0.97\n" +
+           // The upper panel: both levels.
+           "set tmargin at screen 0.91\nset bmargin at screen 0.45\nset key bottom center maxrows 1\nset offsets 0,0,2,10\n" +
+           "set ylabel \"dB\"\n" + ticks(false) + "plot " + lines +
+           ", $data using 1:3 with linespoints lw 2 pt 5 ps 0.8 lc rgb '#1f6fb4' title \"" + gnuplotText(fileName(after->path)) +
+           "\" noenhanced\n" +
+           // The lower panel: the change, as bars of most of an octave.
+           "unset title\nunset key\nset tmargin at screen 0.41\nset bmargin at screen 0.12\nset offsets 0,0,3,3\n" + ticks(true) +
+           "set ylabel \"change in dB\"\nset xlabel \"Hz\" offset 0,0.3\nset xzeroaxis lt 1 lc rgb '#555555'\n" +
+           "set style fill solid 0.8 noborder\nplot $data using 1:4:($1*0.45) with boxes lc rgb '#1f6fb4', " +
            "$data using 1:4:(sprintf('%+.1f',$4)) with labels font ',10' offset 0,0.7\nunset multiplot\n";
 }
 
 void runLevels(const LevelsOptions &options) {
     std::unique_ptr<Plot> plot;
-    if (!options.plot.empty()) plot = std::make_unique<Plot>(options.plot, options.force);
+    if (!options.plots.empty()) plot = std::make_unique<Plot>(options.plots, options.force);
     const bool silent = options.common.quiet || options.common.json;
     const Levels before = measure(options.first, silent);
     std::unique_ptr<Levels> after;
@@ -182,8 +186,6 @@ void runLevels(const LevelsOptions &options) {
     } else if (!options.common.quiet) {
         printText(before, after.get(), Style(options.common.colour, stdout));
     }
-    if (!made.empty() && made.front() != plot->path())
-        std::cerr << "vx: gnuplot is not there; its script is " << made.front() << "\n";
     if (!silent)
         for (const std::string &file : made) std::cout << "wrote " << file << "\n";
 }
@@ -195,7 +197,10 @@ void addLevelsVerb(CLI::App &app, int &) {
     CLI::App *verb = app.add_subcommand("levels", "Level per octave band of a recording, or what changed between two");
     verb->add_option("FILE", options->first, "Recording; - for standard input")->required();
     verb->add_option("AFTER", options->second, "A second recording, to be compared with the first");
-    verb->add_option("--plot", options->plot, "Draw the levels into a .svg or .png, with the numbers as .csv beside it")
+    verb->add_option("--plot", options->plots,
+                     "Draw the levels into a .svg or .png, with the numbers as .csv beside it; may be repeated")
+        ->allow_extra_args(false)
+
         ->type_name("FILE");
     verb->add_flag("--force", options->force, "Write over files that exist");
     addCommonOptions(*verb, options->common);

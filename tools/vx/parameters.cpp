@@ -97,7 +97,7 @@ double decibelsOf(const std::string &text, const std::string &value, double lowe
     if (hasUnit) digits.resize(digits.size() - 2);
     const auto number = parseNumber(digits);
     const std::string wanted =
-        (slider ? "a slider's position from 0 to 1 or " : "") + format("decibels from %gdB to %gdB", lowest, highest);
+        (slider ? "a slider's position from 0 to 1 or " : "") + textf("decibels from %gdB to %gdB", lowest, highest);
     if (!number || (!hasUnit && !slider)) failUsage("--set", text, "expected " + wanted);
     if (!hasUnit && (*number < 0.0 || *number > 1.0)) failUsage("--set", text, "is outside the slider; expected " + wanted);
     if (hasUnit && (*number < lowest || *number > highest)) failUsage("--set", text, "is out of range; expected " + wanted);
@@ -133,8 +133,8 @@ ParameterWrite parseParameter(const std::string &text) {
     const auto id = parseInteger(address[1], kLowestId, kHighestId);
     const auto channel = address.size() == 3 ? parseInteger(address[2], 0, UINT32_MAX) : 0;
     if (!component)
-        failUsage("--param", text, format("the component must be a number from %d to %d", kLowestComponent, kHighestComponent));
-    if (!id) failUsage("--param", text, format("the id must be a number from %d to %d", kLowestId, kHighestId));
+        failUsage("--param", text, textf("the component must be a number from %d to %d", kLowestComponent, kHighestComponent));
+    if (!id) failUsage("--param", text, textf("the id must be a number from %d to %d", kLowestId, kHighestId));
     if (!channel) failUsage("--param", text, "the channel must be a number from 0 on");
     ParameterWrite write = {text, static_cast<int32_t>(*component), static_cast<int32_t>(*id), static_cast<uint32_t>(*channel), {}};
     for (const std::string &part : split(text.substr(equals + 1), ',')) {
@@ -143,7 +143,7 @@ ParameterWrite parseParameter(const std::string &text) {
             failUsage("--param", text, "\"" + part + "\" is no value; expected u8:1, u16:1, u32:1, i32:-1, f32:1.5 or hex:00ff");
     }
     if (write.data.size() > kMostBytes)
-        failUsage("--param", text, format("has %zu bytes; a parameter holds at most 65536", write.data.size()));
+        failUsage("--param", text, textf("has %zu bytes; a parameter holds at most 65536", write.data.size()));
     return write;
 }
 
@@ -183,11 +183,11 @@ std::string settingNames() {
     for (const Setting &setting : kSettings) {
         const std::string range = setting.kind == Kind::toggle ? "on or off"
                                   : setting.kind == Kind::slider
-                                      ? format("0 to 1, or %gdB to %+gdB", setting.lowestDb, setting.highestDb)
-                                      : format("%gdB to %+gdB", setting.lowestDb, setting.highestDb);
-        lines += format("  %-12s %-24s %s\n", setting.name, range.c_str(), setting.meaning);
+                                      ? textf("0 to 1, or %gdB to %+gdB", setting.lowestDb, setting.highestDb)
+                                      : textf("%gdB to %+gdB", setting.lowestDb, setting.highestDb);
+        lines += textf("  %-12s %-24s %s\n", setting.name, range.c_str(), setting.meaning);
     }
-    lines += format("  %-12s %-24s %s\n", "eq1 ... eq10", "0 to 1, or -18dB to +18dB", "31 62 125 250 500 1k 2k 4k 8k 1.6k Hz");
+    lines += textf("  %-12s %-24s %s\n", "eq1 ... eq10", "0 to 1, or -18dB to +18dB", "31 62 125 250 500 1k 2k 4k 8k 1.6k Hz");
     return lines;
 }
 

@@ -3,6 +3,7 @@
 
 #include <cmath>
 #include <cstdlib>
+#include <iostream>
 
 #include "tools/vx/output_file.h"
 #include "tools/vx/system.h"
@@ -13,6 +14,8 @@ namespace vx {
 namespace fs = std::filesystem;
 
 namespace {
+
+constexpr const char *kSvg = ".svg";
 
 std::string quotedCell(const std::string &text) {
     if (text.find_first_of(",\"\n") == std::string::npos) return text;
@@ -31,7 +34,7 @@ std::string dataBlock(const Table &table) {
     std::string block = "$data << EOD\n";
     for (size_t row = 0; row < table.rows.size(); ++row) {
         if (!table.labels.empty()) block += "\"" + gnuplotText(table.labels[row]) + "\" ";
-        for (const double value : table.rows[row]) block += std::isnan(value) ? std::string("NaN ") : format("%.9g ", value);
+        for (const double value : table.rows[row]) block += std::isnan(value) ? std::string("NaN ") : textf("%.9g ", value);
         block += "\n";
     }
     return block + "EOD\n";
@@ -66,48 +69,57 @@ std::string csvText(const Table &table) {
         if (!table.labels.empty()) text += quotedCell(table.labels[row]);
         for (size_t column = 0; column < table.rows[row].size(); ++column) {
             if (column > 0 || !table.labels.empty()) text += ",";
-            if (!std::isnan(table.rows[row][column])) text += format("%.9g", table.rows[row][column]);
+            if (!std::isnan(table.rows[row][column])) text += textf("%.9g", table.rows[row][column]);
         }
         text += "\n";
     }
     return text;
 }
 
-Plot::Plot(const std::string &path, bool force) : path_(path), force_(force) {
-    const std::string ending = lowered(utf8Of(pathOf(path).extension()));
-    if (ending != ".svg" && ending != ".png")
-        throw Failure(ExitStatus::usage, "--plot " + path + ": expected a name that ends in .svg or .png");
-    stem_ = path.substr(0, path.size() - ending.size());
-    csvPath_ = stem_ + ".csv";
-    checkMayWrite(path_, force);
+Plot::Plot(const std::vector<std::string> &paths, bool force) : paths_(paths), force_(force) {
+    for (const std::string &path : paths) {
+        const std::string ending = lowered(utf8Of(pathOf(path).extension()));
+        if (ending != kSvg && ending != ".png")
+            throw Failure(ExitStatus::usage, "--plot " + path + ": expected a name that ends in .svg or .png");
+        checkMayWrite(path, force);
+    }
+    csvPath_ = utf8Of(pathOf(paths.at(0)).replace_extension(".csv"));
     checkMayWrite(csvPath_, force);
 }
 
 std::vector<std::string> Plot::draw(const Table &table, const std::string &commands) const {
-    writeWhole(csvPath_, csvText(table), force_);
-    const bool svg = lowered(path_).ends_with(".svg");
-    // The picture, too, takes its name only when it is whole.
-    const OutputFile picture(path_, force_);
-    const std::string temporary = utf8Of(picture.writePath());
-    const std::string script = stem_ + ".gp";
-    const std::string data = dataBlock(table);
-    const std::string scratch = temporary + ".gp";
-    writeWhole(scratch, head(temporary, svg) + data + commands, true);
-    const char *named = std::getenv("VX_GNUPLOT");
-    const std::string program = named != nullptr && *named != '\0' ? named : "gnuplot";
-    const std::optional<int> status = runProgram({program, scratch});
-    std::error_code ignored;
-    fs::remove(pathOf(scratch), ignored);
-    if (!status) {
-        writeWhole(script, head(path_, svg) + data + commands, force_);
-        return {script, csvPath_};
+    const std::string text = dataBlock(table) + commands;
+    std::vector<std::string> made;
+    for (const std::string &path : paths_) {
+        if (drawOne(path, text)) {
+            made.push_back(path);
+            continue;
+        }
+        const std::string script = path + ".gp";
+        writeWhole(script, head(path, lowered(path).ends_with(kSvg)) + text, force_);
+        std::cerr << "vx: " << path << ": gnuplot is not there; install it and run it on " << script << "\n";
+        made.push_back(script);
     }
-    if (*status != 0)
-        throw Failure(ExitStatus::system,
-                      path_ + ": gnuplot failed with exit status " + std::to_string(*status) + "; the numbers are in " + csvPath_);
-    fs::rename(pathOf(temporary), pathOf(path_), ignored);
-    if (ignored) throw Failure(ExitStatus::system, path_ + ": cannot be named so: " + ignored.message());
-    return {path_, csvPath_};
+    writeWhole(csvPath_, csvText(table), force_);
+    made.push_back(csvPath_);
+    return made;
+}
+
+bool Plot::drawOne(const std::string &path, const std::string &text) const {
+    // Gnuplot writes under a temporary name as well: a picture takes its own only when it is whole.
+    OutputFile picture(path, force_);
+    picture.closeStream();
+    const std::string drawing = utf8Of(picture.writePath());
+    const std::string script = drawing + ".gp";
+    writeWhole(script, head(drawing, lowered(path).ends_with(kSvg)) + text, true);
+    const char *named = std::getenv("VX_GNUPLOT");
+    const std::optional<int> status = runProgram({named != nullptr && *named != '\0' ? named : "gnuplot", script});
+    std::error_code ignored;
+    fs::remove(pathOf(script), ignored);
+    if (!status) return false;
+    if (*status != 0) throw Failure(ExitStatus::system, path + ": gnuplot failed with exit status " + std::to_string(*status));
+    picture.commit();
+    return true;
 }
 
 }  // namespace vx

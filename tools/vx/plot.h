@@ -19,21 +19,23 @@ struct Table {
 std::string csvText(const Table &table);
 
 // The files that a plot makes, all known ahead, so that nothing is written over unasked.
+// The pictures of one description and the numbers beside them, all named ahead, so that nothing is written over unasked.
 class Plot {
   public:
-    // `path` ends in .svg or .png; fails otherwise, and if the picture or its CSV is there and `force` is not given.
-    Plot(const std::string &path, bool force);
-
-    const std::string &path() const { return path_; }
-    const std::string &csvPath() const { return csvPath_; }
+    // `paths` end in .svg or .png; fails otherwise, and if a picture or the CSV is there and `force` is not given. The CSV has the
+    // first picture's name.
+    Plot(const std::vector<std::string> &paths, bool force);
 
     // Draws `commands`, gnuplot's, behind the head that sets terminal, fonts and grid; $data in them holds the table, columns by
-    // blanks. Returns the files that were made, the picture or the script first.
+    // blanks. Returns the files that were made. Without gnuplot these are a script for each picture and the CSV, and standard error
+    // says so.
     std::vector<std::string> draw(const Table &table, const std::string &commands) const;
 
   private:
-    std::string path_;
-    std::string stem_;
+    // False if there is no gnuplot.
+    bool drawOne(const std::string &path, const std::string &text) const;
+
+    std::vector<std::string> paths_;
     std::string csvPath_;
     bool force_;
 };

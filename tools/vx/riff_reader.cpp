@@ -101,7 +101,7 @@ void RiffReader::parse() {
 }
 
 void RiffReader::readFormat(uint32_t size) {
-    if (size < kPlainFormat || size > kLongestFormat) fail(format("the format chunk has %u bytes, expected 16 to 4096", size));
+    if (size < kPlainFormat || size > kLongestFormat) fail(textf("the format chunk has %u bytes, expected 16 to 4096", size));
     uint8_t bytes[kExtensibleFormat] = {};
     const size_t taken = std::min<size_t>(size, kExtensibleFormat);
     need(bytes, taken, "the format chunk");
@@ -110,7 +110,7 @@ void RiffReader::readFormat(uint32_t size) {
     format_.sampleRate = static_cast<int>(std::min<uint32_t>(word32(bytes + 4), INT32_MAX));
     const int bits = word16(bytes + 14);
     if (tag == kTagExtensible) {
-        if (size < kExtensibleFormat) fail(format("the extensible format chunk has %u bytes, expected 40", size));
+        if (size < kExtensibleFormat) fail(textf("the extensible format chunk has %u bytes, expected 40", size));
         if (std::memcmp(bytes + 26, kSubformatTail.data(), kSubformatTail.size()) != 0)
             fail("an unknown subformat; vx reads PCM and float");
         tag = word16(bytes + 24);
@@ -121,8 +121,8 @@ void RiffReader::readFormat(uint32_t size) {
     if (std::popcount(format_.mask) != format_.channels) format_.mask = 0;
     frameBytes_ = static_cast<size_t>(format_.channels) * static_cast<size_t>(bits / 8);
     if (word16(bytes + 12) != frameBytes_)
-        fail(format("a frame is said to have %d bytes, expected %d channels of %d bits", word16(bytes + 12), format_.channels,
-                    bits));
+        fail(
+            textf("a frame is said to have %d bytes, expected %d channels of %d bits", word16(bytes + 12), format_.channels, bits));
     skip(size - taken, "the format chunk");
 }
 
@@ -140,8 +140,8 @@ void RiffReader::chooseCoding(uint16_t tag, int bits) {
     else if (tag == kTagFloat && bits == 64)
         coding_ = Coding::float64;
     else
-        fail(format("format tag %u with %d bits; expected PCM (1) of 8, 16, 24 or 32 bits or float (3) of 32 or 64", tag, bits));
-    format_.encoding = format("WAV, %d-bit %s", bits, tag == kTagFloat ? "float" : "PCM");
+        fail(textf("format tag %u with %d bits; expected PCM (1) of 8, 16, 24 or 32 bits or float (3) of 32 or 64", tag, bits));
+    format_.encoding = textf("WAV, %d-bit %s", bits, tag == kTagFloat ? "float" : "PCM");
 }
 
 void RiffReader::beginData(uint32_t size) {

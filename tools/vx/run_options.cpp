@@ -76,7 +76,9 @@ void addFormatOptions(CLI::App &verb, RunOptions &options) {
 
 void addResultOptions(CLI::App &verb, RunOptions &options) {
     const char *group = "Results";
-    verb.add_option("--plot", options.plot, "Draw a histogram of the load into a .svg or .png, with the numbers as .csv beside it")
+    verb.add_option("--plot", options.plots,
+                    "Draw a histogram of the load into a .svg or .png, with the numbers as .csv beside it; may be repeated")
+        ->allow_extra_args(false)
         ->type_name("FILE")
         ->group(group);
     verb.add_option("--levels-csv", options.levelsCsv, "Write the peaks and the load of every block as CSV")

@@ -32,7 +32,7 @@ struct RunOptions {
     int loops = 1;
     int recordRate = 0;
     std::string bits;
-    std::string plot;
+    std::vector<std::string> plots;
     std::string levelsCsv;
     bool digest = false;
     bool force = false;

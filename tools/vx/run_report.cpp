@@ -35,7 +35,7 @@ double realTimeFactor(const RunReport &report) {
 
 std::string hexText(const std::vector<uint8_t> &bytes) {
     std::string text;
-    for (const uint8_t byte : bytes) text += format("%02x", byte);
+    for (const uint8_t byte : bytes) text += textf("%02x", byte);
     return text;
 }
 
@@ -43,13 +43,13 @@ std::string levelRows(const char *side, uint32_t mask, const std::vector<Channel
     std::string rows;
     for (size_t channel = 0; channel < levels.size(); ++channel) {
         const ChannelLevel &level = levels[channel];
-        const std::string clipped = format("%10llu", static_cast<unsigned long long>(level.clipped));
-        rows += format("  %-6s %-4s %12s  ", side, speakerName(mask, static_cast<int>(channel)).c_str(),
-                       decibelText(static_cast<double>(level.peak)).c_str()) +
+        const std::string clipped = textf("%10llu", static_cast<unsigned long long>(level.clipped));
+        rows += textf("  %-6s %-4s %12s  ", side, speakerName(mask, static_cast<int>(channel)).c_str(),
+                      decibelText(static_cast<double>(level.peak)).c_str()) +
                 (level.clipped > 0 ? style.warning(clipped) : clipped);
         if (level.notANumber > 0)
             rows +=
-                style.warning(format("  and %llu samples that are no numbers", static_cast<unsigned long long>(level.notANumber)));
+                style.warning(textf("  and %llu samples that are no numbers", static_cast<unsigned long long>(level.notANumber)));
         rows += "\n";
     }
     return rows;
@@ -72,37 +72,36 @@ nlohmann::ordered_json layoutJson(uint32_t mask) {
 }  // namespace
 
 std::string digestText(uint64_t digest) {
-    return format("%016llx", static_cast<unsigned long long>(digest));
+    return textf("%016llx", static_cast<unsigned long long>(digest));
 }
 
 std::string runText(const RunOptions &options, const RunReport &report, const Style &style) {
     const std::string platform = options.platform.value_or("none");
     std::string text = style.bold(options.input == "-" ? "standard input" : options.input) +
-                       format(": %s, %d Hz, %s, %.2f s\n", layoutText(report.fileMask).c_str(), report.file.sampleRate,
-                              report.file.encoding.c_str(), audioSeconds(report));
-    text += "engine   " + report.engineFile + format(", platform %s, host type %d\n", platform.c_str(), options.hostType);
+                       textf(": %s, %d Hz, %s, %.2f s\n", layoutText(report.fileMask).c_str(), report.file.sampleRate,
+                             report.file.encoding.c_str(), audioSeconds(report));
+    text += "engine   " + report.engineFile + textf(", platform %s, host type %d\n", platform.c_str(), options.hostType);
     text += "format   " + layoutText(report.inputMask) + " to " + layoutText(report.outputMask) +
-            format(", blocks of %d frames\n", options.block);
+            textf(", blocks of %d frames\n", options.block);
     for (const ParameterAnswer &answer : report.parameters) {
         text += "sent     " + answer.write.text;
         if (!answer.write.isInputGain)
-            text += format("  (component %d, parameter %d)", answer.write.componentId, answer.write.paramId);
+            text += textf("  (component %d, parameter %d)", answer.write.componentId, answer.write.paramId);
         if (answer.result == 0) text += style.warning("  answered with 0: the engine may not have taken it");
         text += "\n";
     }
     text += "\n" + style.bold("levels           peak, 0 dB = 1.0   above 1.0") + "\n";
     text += levelRows("in", report.fileMask, report.inputLevels, style);
     text += levelRows("out", report.outputMask, report.outputLevels, style);
-    text +=
-        format("  silence called by the library: %.2f s\n\n", static_cast<double>(report.silentFrames) / report.file.sampleRate);
-    text += style.bold(format("load     %llu blocks of %.3f ms", static_cast<unsigned long long>(report.load.blocks()),
-                              report.blockNs(options.block) / 1e6)) +
+    text += textf("  silence called by the library: %.2f s\n\n", static_cast<double>(report.silentFrames) / report.file.sampleRate);
+    text += style.bold(textf("load     %llu blocks of %.3f ms", static_cast<unsigned long long>(report.load.blocks()),
+                             report.blockNs(options.block) / 1e6)) +
             "\n";
     for (const LoadFigure &figure : loadFigures(report.load))
-        text += format("  %-6s %10.2f us  %8.3f %%\n", figure.name, figure.nanoseconds / 1000.0,
-                       100.0 * figure.nanoseconds / report.blockNs(options.block));
-    text += format("  %.0f times faster than real time inside the block, %.0f times with reading and writing\n",
-                   realTimeFactor(report), audioSeconds(report) / std::max(report.wallSeconds, 1e-9));
+        text += textf("  %-6s %10.2f us  %8.3f %%\n", figure.name, figure.nanoseconds / 1000.0,
+                      100.0 * figure.nanoseconds / report.blockNs(options.block));
+    text += textf("  %.0f times faster than real time inside the block, %.0f times with reading and writing\n",
+                  realTimeFactor(report), audioSeconds(report) / std::max(report.wallSeconds, 1e-9));
     if (options.digest) text += "\ndigest   " + digestText(report.digest) + "\n";
     return text;
 }
@@ -160,32 +159,32 @@ std::string loadPlotCommands(const RunOptions &options, const RunReport &report)
     double most = 1.0;
     for (const LoadBar &bar : bars) most = std::max(most, static_cast<double>(bar.blocks));
     const double lowest = bars.front().lowestNs / 1000.0 / 1.6;
-    const double highest = bars.back().highestNs / 1000.0 * 1.6;
+    const double highest = bars.back().highestNs / 1000.0 * 4.0;  // room for a label
     const double top = most * 5.0;
-    std::string text = format("set title \"Load of %llu blocks of %d frames (%.3f ms) in %s\" noenhanced\n",
-                              static_cast<unsigned long long>(report.load.blocks()), options.block, block / 1e6,
-                              gnuplotText(report.engineFile).c_str());
-    text += format("set logscale x 10\nset logscale x2 10\nset xrange [%.9g:%.9g]\nset x2range [%.9g:%.9g]\n", lowest, highest,
-                   lowest * 1e5 / block, highest * 1e5 / block);
+    std::string text = textf("set title \"Load of %llu blocks of %d frames (%.3f ms) in %s\" noenhanced\n",
+                             static_cast<unsigned long long>(report.load.blocks()), options.block, block / 1e6,
+                             gnuplotText(report.engineFile).c_str());
+    text += textf("set logscale x 10\nset logscale x2 10\nset xrange [%.9g:%.9g]\nset x2range [%.9g:%.9g]\n", lowest, highest,
+                  lowest * 1e5 / block, highest * 1e5 / block);
     text +=
-        "set xlabel \"microseconds in VXDSPAPI_Process\"\nset x2label \"percent of the block's duration\"\nset x2tics nomirror\n";
+        "set xlabel \"microseconds in VXDSPAPI_Process\" noenhanced\nset x2label \"percent of the block's duration\"\nset x2tics "
+        "nomirror\n";
     // Ticks at 1-2-5 over every decade that can occur.
     for (const char *axis : {"x", "x2"}) {
         std::string tics;
         for (int decade = -6; decade <= 9; ++decade)
-            for (const int step : {1, 2, 5}) tics += format("%s%g", tics.empty() ? "" : ",", step * std::pow(10.0, decade));
+            for (const int step : {1, 2, 5}) tics += textf("%s%g", tics.empty() ? "" : ",", step * std::pow(10.0, decade));
         text += std::string("set ") + axis + "tics (" + tics + ")\n";
     }
-    text += format(
-        "set ylabel \"blocks\"\nset logscale y 10\nset yrange [0.7:%.9g]\nset style fill solid 0.8 noborder\nunset key\n", top);
+    text += textf("set ylabel \"blocks\"\nset logscale y 10\nset yrange [0.7:%.9g]\nset style fill solid 0.8 noborder\nunset key\n",
+                  top);
     double height = top / 1.3;
     for (const LoadFigure &figure : loadFigures(report.load)) {
         if (figure.name == std::string("mean")) continue;
         const double us = figure.nanoseconds / 1000.0;
-        const bool right = us > std::sqrt(lowest * highest);
-        text += format("set arrow from %.9g,0.7 to %.9g,%.9g nohead lw 1.5 dt 2 lc rgb '#c0392b' front\n", us, us, height);
-        text += format("set label \"%s%s %.1f us%s\" at %.9g,%.9g %s tc rgb '#c0392b' front\n", right ? "" : " ", figure.name, us,
-                       right ? " " : "", us, height, right ? "right" : "left");
+        text += textf("set arrow from %.9g,0.7 to %.9g,%.9g nohead lw 1.5 dt 2 lc rgb '#c0392b' front\n", us, us, height);
+        // Each line is shorter than the one to its left, so that no label is crossed.
+        text += textf("set label \" %s %.1f us\" at %.9g,%.9g left tc rgb '#c0392b' front\n", figure.name, us, us, height);
         height /= most > 100.0 ? 1.9 : 1.4;
     }
     return text + "plot $data using (sqrt($1*$2)):3:1:2:(0.7):($3>0?$3:0.7) with boxxyerror lc rgb '#1f6fb4'\n";

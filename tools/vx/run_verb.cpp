@@ -17,14 +17,13 @@ namespace {
 void run(const RunOptions &options) {
     checkRunOptions(options);
     std::unique_ptr<Plot> plot;
-    if (!options.plot.empty()) plot = std::make_unique<Plot>(options.plot, options.force);
+    if (!options.plots.empty()) plot = std::make_unique<Plot>(options.plots, options.force);
     const RunReport report = runSession(options);
     std::vector<std::string> files;
     if (!options.output.empty() && options.output != "-") files.push_back(options.output);
     if (!options.levelsCsv.empty()) files.push_back(options.levelsCsv);
     if (plot) {
         const std::vector<std::string> made = plot->draw(loadTable(options, report), loadPlotCommands(options, report));
-        if (made.front() != plot->path()) std::cerr << "vx: gnuplot is not there; its script is " << made.front() << "\n";
         files.insert(files.end(), made.begin(), made.end());
     }
     if (options.common.json) {

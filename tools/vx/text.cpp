@@ -9,7 +9,7 @@
 
 namespace vx {
 
-std::string format(const char *pattern, ...) {
+std::string textf(const char *pattern, ...) {
     std::va_list arguments;
     std::va_list again;
     va_start(arguments, pattern);
@@ -74,7 +74,7 @@ std::string lowered(std::string text) {
 }
 
 std::string decibelText(double linear) {
-    return linear > 0.0 ? format("%.2f dB", 20.0 * std::log10(linear)) : "silent";
+    return linear > 0.0 ? textf("%.2f dB", 20.0 * std::log10(linear)) : "silent";
 }
 
 }  // namespace vx

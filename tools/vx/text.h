@@ -13,7 +13,7 @@
 namespace vx {
 
 // printf into a string.
-[[gnu::format(gnu_printf, 1, 2)]] std::string format(const char *pattern, ...);
+[[gnu::format(gnu_printf, 1, 2)]] std::string textf(const char *pattern, ...);
 
 std::filesystem::path pathOf(const std::string &utf8);
 std::string utf8Of(const std::filesystem::path &path);
