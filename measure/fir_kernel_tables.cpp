@@ -24,13 +24,17 @@ FirKernelTables make(const FirKernels &kernels, int log2Size) {
     const FirTwiddlePair &twiddles = firTwiddles(log2Size);
     const int size = 1 << log2Size;
     const size_t values = static_cast<size_t>(size);
-    FirKernelTables tables{makeAlignedArray<double>(2 * values), makeAlignedArray<double>(2 * values),
-                           makeAlignedArray<double>(values), makeAlignedArray<double>(values)};
+    FirKernelTables tables{makeAlignedArray<double>(2 * values * static_cast<size_t>(kernels.copies)),
+                           makeAlignedArray<double>(2 * values), makeAlignedArray<double>(values),
+                           makeAlignedArray<double>(values)};
     for (int l = 1; l < size; l *= 2) {
         for (int j = 0; j < l; ++j) {
             const int from = l + reverseBits(j, l);
-            tables.forward[2 * (l + j)] = twiddles.forward.real[from];
-            tables.forward[2 * (l + j) + 1] = twiddles.forward.imaginary[from];
+            for (int copy = 0; copy < kernels.copies; ++copy) {
+                double *const factor = tables.forward.get() + 2 * kernels.copies * (l + j);
+                factor[copy] = twiddles.forward.real[from];
+                factor[kernels.copies + copy] = twiddles.forward.imaginary[from];
+            }
             tables.inverseReal[l + j] = twiddles.inverse.real[l + j];
             tables.inverseImaginary[l + j] = twiddles.inverse.imaginary[l + j];
         }
@@ -43,7 +47,7 @@ FirKernelTables make(const FirKernels &kernels, int log2Size) {
                 for (int part = 0; part < 2; ++part) {
                     for (int lane = 0; lane < kernels.lanes; ++lane) {
                         const int heap = (size / kernels.group + chunk / kernels.group + lane) * blocks + block;
-                        *next++ = tables.forward[2 * heap + part];
+                        *next++ = tables.forward[kernels.copies * (2 * heap + part)];
                     }
                 }
             }

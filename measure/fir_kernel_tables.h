@@ -13,16 +13,18 @@
 namespace vxcomn {
 
 struct FirKernelTables {
-    AlignedArray<double> forward;           // factor of block b of stage l: real and imaginary part at 2 (l + b)
+    AlignedArray<double> forward;           // factor of block b of stage l: real and imaginary part, `copies` times each
     AlignedArray<double> middle;            // forward factors of the stages within a group, vector by vector as they are used
     AlignedArray<double> inverseReal;       // factor j of stage l at l + j
     AlignedArray<double> inverseImaginary;  // the same
 };
 
-// The inverse stages of the last pass. What is left, 2^(log2Size - levels) values, makes a row of the work memory.
+// The inverse stages of the last pass. What is left, 2^(log2Size - levels) values, makes a row of the work memory. Large transforms
+// have shorter rows, so that a row fits the first cache.
 VXCOMN_RT_INLINE int firFinalLevels(const FirKernels &kernels, int log2Size) noexcept {
+    const int most = log2Size >= 12 ? 3 : kernels.levels;
     int levels = 0;
-    while (levels < 3 && (kernels.group << (levels + 1)) <= (1 << log2Size)) ++levels;
+    while (levels < most && (kernels.group << (levels + 1)) <= (1 << log2Size)) ++levels;
     return levels;
 }
 

@@ -28,6 +28,8 @@ struct FirBlock {
 struct FirKernels {
     int lanes;        // doubles a register
     int group;        // the last `group` values of the transform are worked on within registers; a power of two
+    int levels;       // the most stages that a pass fuses; 2 or 3
+    int copies;       // how often the table of the forward factors has each value
     int minLog2Size;  // smaller transforms don't fill the registers
     void (*process)(const FirBlock &block) noexcept;
 };

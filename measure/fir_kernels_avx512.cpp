@@ -15,6 +15,6 @@ VXCOMN_RT void process(const FirBlock &block) noexcept {
 
 }  // namespace
 
-const FirKernels kFirKernelsAvx512 = {kLanes, kGroup, 6, process};
+const FirKernels kFirKernelsAvx512 = {kLanes, kGroup, kLevels, 1, 6, process};
 
 }  // namespace vxcomn

@@ -56,6 +56,16 @@ VXCOMN_RT_INLINE Vector everyLane(double value) noexcept {
     return value - Vector{};
 }  // x - 0 is x, also for -0
 
+// A factor of the forward table, in every lane. Where a register can't be filled from one value in memory, the table holds it
+// twice.
+VXCOMN_RT_INLINE Complex forwardFactor(const double *factors, int index) noexcept {
+#if VXCOMN_FIR_LANES == 2
+    return {loadVector(factors + 4 * index), loadVector(factors + 4 * index + 2)};
+#else
+    return {everyLane(factors[2 * index]), everyLane(factors[2 * index + 1])};
+#endif
+}
+
 VXCOMN_RT_INLINE Vector loadWidened(const float *from) noexcept {
     const Floats narrow = *reinterpret_cast<const AnyFloats *>(from);
     return __builtin_convertvector(narrow, Vector);
@@ -132,13 +142,14 @@ VXCOMN_RT_INLINE void transpose(Vector *rows) noexcept {
 struct Piece {
     const FirBlock *block;
     int size;
-    int rowLength;     // a power of two
-    int rowShift;      // its logarithm
-    int rowStride;     // doubles from row to row
-    int imaginary;     // doubles from a real part to its imaginary part
-    double *positive;  // the input widened, with +0 for -0, and zeros behind it
-    double *original;  // the input widened, and zeros behind it
-    double *real;      // the output before it is rounded
+    int rowLength;                 // a power of two
+    int rowShift;                  // its logarithm
+    int rowStride;                 // doubles from row to row
+    int imaginary;                 // doubles from a real part to its imaginary part
+    double *positive;              // the input widened, with +0 for -0, and zeros behind it
+    double *original;              // the input widened, and zeros behind it
+    double *real;                  // the output before it is rounded
+    Complex groupFactors[kGroup];  // of the inverse stages within a group, in every lane; from index 1 on
 
     VXCOMN_RT_INLINE double *at(int position) const noexcept {
         return block->work + (position >> rowShift) * rowStride + (position & (rowLength - 1));
@@ -161,17 +172,16 @@ VXCOMN_RT_INLINE void firstPass(const Piece &piece, int l, int firstBlock, int e
             Complex x[kLegs];
             VXCOMN_FIR_UNROLL
             for (int m = 0; m < kLegs; ++m) x[m].real = loadVector(from + m * step + r);
-            const double *const factor = factors + 2 * (l + b);
-            const Complex u = {everyLane(factor[0]), everyLane(factor[1])};
+            const Complex u = forwardFactor(factors, l + b);
             VXCOMN_FIR_UNROLL
             for (int m = 0; m < kLegs / 2; ++m) realButterfly(x[m], x[m + kLegs / 2], u);
             VXCOMN_FIR_UNROLL
             for (int s = 1; s < Levels; ++s) {
                 const int span = kLegs >> (s + 1);
+                const int blocks = 1 << s;
                 VXCOMN_FIR_UNROLL
-                for (int k = 0; k < (1 << s); ++k) {
-                    const double *const inner = factors + 2 * (((l + b) << s) + k);
-                    const Complex v = {everyLane(inner[0]), everyLane(inner[1])};
+                for (int k = 0; k < blocks; ++k) {
+                    const Complex v = forwardFactor(factors, ((l + b) << s) + k);
                     VXCOMN_FIR_UNROLL
                     for (int m = 0; m < span; ++m) butterfly(x[2 * span * k + m], x[2 * span * k + span + m], v);
                 }
@@ -203,10 +213,10 @@ VXCOMN_RT_INLINE void forwardPass(const Piece &piece, int l, int firstBlock, int
             VXCOMN_FIR_UNROLL
             for (int s = 0; s < Levels; ++s) {
                 const int span = kLegs >> (s + 1);
+                const int blocks = 1 << s;
                 VXCOMN_FIR_UNROLL
-                for (int k = 0; k < (1 << s); ++k) {
-                    const double *const factor = factors + 2 * (((l + b) << s) + k);
-                    const Complex u = {everyLane(factor[0]), everyLane(factor[1])};
+                for (int k = 0; k < blocks; ++k) {
+                    const Complex u = forwardFactor(factors, ((l + b) << s) + k);
                     VXCOMN_FIR_UNROLL
                     for (int m = 0; m < span; ++m) butterfly(x[2 * span * k + m], x[2 * span * k + span + m], u);
                 }
@@ -225,8 +235,6 @@ VXCOMN_RT_INLINE void middlePass(const Piece &piece, int position) noexcept {
     const int chunk = position / kChunk;
     const double *factor = piece.block->tables->middle.get() + chunk * (2 * kLanes * (kGroup - 1));
     const double *const response = piece.block->response + chunk * (2 * kChunk);
-    const double *const inverseReal = piece.block->tables->inverseReal.get();
-    const double *const inverseImaginary = piece.block->tables->inverseImaginary.get();
     double *groups[kLanes];
     VXCOMN_FIR_UNROLL
     for (int q = 0; q < kLanes; ++q) groups[q] = piece.at(position + q * kGroup);
@@ -249,8 +257,9 @@ VXCOMN_RT_INLINE void middlePass(const Piece &piece, int position) noexcept {
     VXCOMN_FIR_UNROLL
     for (int s = 0; s < kGroupLevels; ++s) {
         const int span = kGroup >> (s + 1);
+        const int blocks = 1 << s;
         VXCOMN_FIR_UNROLL
-        for (int k = 0; k < (1 << s); ++k) {
+        for (int k = 0; k < blocks; ++k) {
             const Complex u = {loadVector(factor), loadVector(factor + kLanes)};
             factor += 2 * kLanes;
             VXCOMN_FIR_UNROLL
@@ -267,7 +276,7 @@ VXCOMN_RT_INLINE void middlePass(const Piece &piece, int position) noexcept {
         const int span = 1 << s;
         VXCOMN_FIR_UNROLL
         for (int j = 0; j < span; ++j) {
-            const Complex u = {everyLane(inverseReal[span + j]), everyLane(inverseImaginary[span + j])};
+            const Complex &u = piece.groupFactors[span + j];
             VXCOMN_FIR_UNROLL
             for (int m = j; m < kGroup; m += 2 * span) butterfly(x[m], x[m + span], u);
         }
@@ -406,12 +415,11 @@ VXCOMN_RT_INLINE void roundOff(float *to, const double *real, int count) noexcep
     for (; i < count; ++i) to[i] = static_cast<float>(real[i]);
 }
 
-// How many stages the next pass takes of those that are left. The first forward pass must come down to rows, so it never takes one
-// of several.
+// How many stages the next pass takes of those that are left. The first forward pass must come down to rows.
 VXCOMN_RT_INLINE int nextLevels(int left) noexcept {
+    if (kLevels == 2) return left % 2 == 0 ? 2 : 1;
     if (left <= 3) return left;
-    if (kLevels == 3) return left % 3 == 0 ? 3 : 2;
-    return left % 2 == 0 ? 2 : 3;
+    return left % 3 == 0 ? 3 : 2;
 }
 
 VXCOMN_RT_INLINE void firstPassOf(int levels, const Piece &piece, int l, int firstBlock, int endBlock) noexcept {
@@ -432,7 +440,7 @@ VXCOMN_RT_INLINE void processPiece(const Piece &piece, int log2Size, const float
     widen(piece, in, length, part);
 
     int left = log2Size - kGroupLevels - copied;
-    const int firstLevels = nextLevels(left);
+    const int firstLevels = kLevels == 2 && left % 2 != 0 && left >= 3 ? 3 : nextLevels(left);
     left -= firstLevels;
     const int stretch = piece.rowLength < kChunk ? kChunk : piece.rowLength;
     const bool copiesFit = part <= stretch;
@@ -504,6 +512,9 @@ VXCOMN_RT_INLINE void processBlock(const FirKernels &kernels, const FirBlock &bl
     piece.positive = block.work + (size >> piece.rowShift) * piece.rowStride;
     piece.original = piece.positive + half;
     piece.real = piece.original + half;
+    for (int i = 1; i < kGroup; ++i) {
+        piece.groupFactors[i] = {everyLane(block.tables->inverseReal[i]), everyLane(block.tables->inverseImaginary[i])};
+    }
     for (int done = 0; done < block.count;) {
         const int length = block.count - done < half ? block.count - done : half;
         processPiece(piece, block.log2Size, block.in + done, block.out + done, length);

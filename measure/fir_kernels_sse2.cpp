@@ -15,6 +15,6 @@ VXCOMN_RT void process(const FirBlock &block) noexcept {
 
 }  // namespace
 
-const FirKernels kFirKernelsSse2 = {kLanes, kGroup, 4, process};
+const FirKernels kFirKernelsSse2 = {kLanes, kGroup, kLevels, 2, 4, process};
 
 }  // namespace vxcomn
