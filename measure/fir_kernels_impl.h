@@ -33,6 +33,9 @@ constexpr int log2Of(int value) {
 }
 constexpr int kGroupLevels = log2Of(kGroup);
 
+// The widest registers take a factor to all lanes as fast as they load a vector; the others find it there.
+constexpr int kFilledFactors = kLanes == 8 ? 1 : kGroup;
+
 typedef double Vector __attribute__((vector_size(kLanes * 8)));
 typedef float Floats __attribute__((vector_size(kLanes * 4)));
 typedef double AnyVector __attribute__((vector_size(kLanes * 8), aligned(8), may_alias));
@@ -142,14 +145,14 @@ VXCOMN_RT_INLINE void transpose(Vector *rows) noexcept {
 struct Piece {
     const FirBlock *block;
     int size;
-    int rowLength;                 // a power of two
-    int rowShift;                  // its logarithm
-    int rowStride;                 // doubles from row to row
-    int imaginary;                 // doubles from a real part to its imaginary part
-    double *positive;              // the input widened, with +0 for -0, and zeros behind it
-    double *original;              // the input widened, and zeros behind it
-    double *real;                  // the output before it is rounded
-    Complex groupFactors[kGroup];  // of the inverse stages within a group, in every lane; from index 1 on
+    int rowLength;                         // a power of two
+    int rowShift;                          // its logarithm
+    int rowStride;                         // doubles from row to row
+    int imaginary;                         // doubles from a real part to its imaginary part
+    double *positive;                      // the input widened, with +0 for -0, and zeros behind it
+    double *original;                      // the input widened, and zeros behind it
+    double *real;                          // the output before it is rounded
+    Complex groupFactors[kFilledFactors];  // of the inverse stages within a group, in every lane
 
     VXCOMN_RT_INLINE double *at(int position) const noexcept {
         return block->work + (position >> rowShift) * rowStride + (position & (rowLength - 1));
@@ -276,7 +279,12 @@ VXCOMN_RT_INLINE void middlePass(const Piece &piece, int position) noexcept {
         const int span = 1 << s;
         VXCOMN_FIR_UNROLL
         for (int j = 0; j < span; ++j) {
+#if VXCOMN_FIR_LANES == 8
+            const Complex u = {everyLane(piece.block->tables->inverseReal[span + j]),
+                               everyLane(piece.block->tables->inverseImaginary[span + j])};
+#else
             const Complex &u = piece.groupFactors[span + j];
+#endif
             VXCOMN_FIR_UNROLL
             for (int m = j; m < kGroup; m += 2 * span) butterfly(x[m], x[m + span], u);
         }
@@ -512,7 +520,7 @@ VXCOMN_RT_INLINE void processBlock(const FirKernels &kernels, const FirBlock &bl
     piece.positive = block.work + (size >> piece.rowShift) * piece.rowStride;
     piece.original = piece.positive + half;
     piece.real = piece.original + half;
-    for (int i = 1; i < kGroup; ++i) {
+    for (int i = 1; i < kFilledFactors; ++i) {
         piece.groupFactors[i] = {everyLane(block.tables->inverseReal[i]), everyLane(block.tables->inverseImaginary[i])};
     }
     for (int done = 0; done < block.count;) {
