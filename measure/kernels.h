@@ -27,7 +27,7 @@ struct SweepRun {
 
 // What the tracking notch works with, at most kNotchPiece samples at a time. The coefficients of a sample belong to the frequency
 // in front of it, so there is one more than samples: the last ones are for the sample behind the piece.
-inline constexpr int kNotchPiece = 64;
+inline constexpr int kNotchPiece = 32;
 struct NotchPiece {
     alignas(64) float gain[kNotchPiece + 16];      // b0 and b2
     alignas(64) float feedback[kNotchPiece + 16];  // b1 and a1
