@@ -67,6 +67,8 @@ struct MeasureKernels {
     double (*sine)(double phase, double step, float *samples, int count);
     // At least one sample of a sweep.
     void (*sweep)(SweepRun &run, float *samples, int count);
+    // Pink noise from the filter states b[0] to b[6] on, whose magnitudes are 0 or from 2^-100 to 2^100, and the generator's word.
+    void (*pink)(float *b, uint32_t &word, float *samples, int count);
     // Moves a sweep on by `count` samples and fills the notch's coefficients from place 1 on, and the turns. rate: Hz. The phase is
     // left to the caller, who adds the turns up.
     void (*notch)(SweepRun &run, double rate, int count, NotchPiece &piece);

@@ -7,6 +7,7 @@
 
 #include "measure/level_lanes.h"
 #include "measure/notch_lanes.h"
+#include "measure/pink_lanes.h"
 #include "measure/source_lanes.h"
 #include "measure/transform_lanes.h"
 
@@ -68,6 +69,10 @@ VXCOMN_RT void sweep(SweepRun &run, float *samples, int count) {
     sweepBlock<Wave>(run, samples, count);
 }
 
+VXCOMN_RT void pink(float *b, uint32_t &word, float *samples, int count) {
+    pinkInLanes<Wave>(b, word, samples, count);
+}
+
 VXCOMN_RT void notch(SweepRun &run, double rate, int count, NotchPiece &piece) {
     notchInLanes<Wave>(run, rate, count, piece);
 }
@@ -78,6 +83,6 @@ void spectrum(const SpectrumJob &job) {
 
 }  // namespace
 
-constinit const MeasureKernels kMeasureKernelsAvx512 = {peaks, anyAbove, mean, copy, sine, sweep, notch, spectrum};
+constinit const MeasureKernels kMeasureKernelsAvx512 = {peaks, anyAbove, mean, copy, sine, sweep, pink, notch, spectrum};
 
 }  // namespace vxcomn
