@@ -22,6 +22,7 @@ namespace {
 constexpr const char *kDefinition =
     "Mean power of all channels over the whole length, octave bands 1000 Hz * 2^n, Hann frames of 0.3 s or more at 75 % overlap; 0 "
     "dB is a sine at full scale.";
+constexpr double kNoChangeDb = 0.01;  // rounding of the samples and of the transform
 constexpr size_t kFramesAtOnce = 4096;
 
 struct LevelsOptions {
@@ -67,7 +68,8 @@ std::string levelText(double decibels) {
 // NaN where one side is silent or not measurable.
 double changeOf(const Levels &before, const Levels &after, size_t band) {
     const double change = after.decibels[band] - before.decibels[band];
-    return std::isfinite(change) ? change : std::numeric_limits<double>::quiet_NaN();
+    if (!std::isfinite(change)) return std::numeric_limits<double>::quiet_NaN();
+    return std::fabs(change) < kNoChangeDb ? 0.0 : change;
 }
 
 void printText(const Levels &before, const Levels *after, const Style &style) {
@@ -166,10 +168,12 @@ std::string plotCommands(const Levels &before, const Levels *after) {
            ", $data using 1:3 with linespoints lw 2 pt 5 ps 0.8 lc rgb '#1f6fb4' title \"" + gnuplotText(fileName(after->path)) +
            "\" noenhanced\n" +
            // The lower panel: the change, as bars of most of an octave.
-           "unset title\nunset key\nset tmargin at screen 0.41\nset bmargin at screen 0.12\nset offsets 0,0,3,3\n" + ticks(true) +
+           "unset title\nunset key\nset tmargin at screen 0.41\nset bmargin at screen 0.12\nset offsets 0,0,4,4\n" + ticks(true) +
            "set ylabel \"change in dB\"\nset xlabel \"Hz\" offset 0,0.3\nset xzeroaxis lt 1 lc rgb '#555555'\n" +
            "set style fill solid 0.8 noborder\nplot $data using 1:4:($1*0.45) with boxes lc rgb '#1f6fb4', " +
-           "$data using 1:4:(sprintf('%+.1f',$4)) with labels font ',10' offset 0,0.7\nunset multiplot\n";
+           // A number stands above a rise and below a fall.
+           "$data using 1:($4>=0?$4:NaN):(sprintf('%+.1f',$4)) with labels font ',10' offset 0,0.7, " +
+           "$data using 1:($4<0?$4:NaN):(sprintf('%+.1f',$4)) with labels font ',10' offset 0,-0.7\nunset multiplot\n";
 }
 
 void runLevels(const LevelsOptions &options) {

@@ -19,7 +19,7 @@ bool isSpecial(const fs::path &path) {
 }
 
 std::string adviceFor(int error) {
-    if (error == ENOSPC || error == EFBIG || error == EDQUOT) return "; make room or choose another folder";
+    if (error == ENOSPC || error == EFBIG) return "; make room or choose another folder";
     if (error == EACCES || error == EROFS || error == EPERM) return "; choose a folder that you may write to";
     if (error == ENOENT || error == ENOTDIR) return "; create the folder first";
     return "";

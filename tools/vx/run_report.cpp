@@ -159,7 +159,9 @@ std::string loadPlotCommands(const RunOptions &options, const RunReport &report)
     double most = 1.0;
     for (const LoadBar &bar : bars) most = std::max(most, static_cast<double>(bar.blocks));
     const double lowest = bars.front().lowestNs / 1000.0 / 1.6;
-    const double highest = bars.back().highestNs / 1000.0 * 4.0;  // room for a label
+    // Room for a label at the right: a quarter of the axis, which is logarithmic.
+    const double last = bars.back().highestNs / 1000.0;
+    const double highest = last * std::max(4.0, std::cbrt(last / lowest));
     const double top = most * 5.0;
     std::string text = textf("set title \"Load of %llu blocks of %d frames (%.3f ms) in %s\" noenhanced\n",
                              static_cast<unsigned long long>(report.load.blocks()), options.block, block / 1e6,
@@ -169,11 +171,12 @@ std::string loadPlotCommands(const RunOptions &options, const RunReport &report)
     text +=
         "set xlabel \"microseconds in VXDSPAPI_Process\" noenhanced\nset x2label \"percent of the block's duration\"\nset x2tics "
         "nomirror\n";
-    // Ticks at 1-2-5 over every decade that can occur.
+    // Ticks at 1-2-5, over every decade that can occur; at 1 alone where many decades leave no room.
+    const std::vector<int> steps = highest / lowest < 1000.0 ? std::vector<int>{1, 2, 5} : std::vector<int>{1};
     for (const char *axis : {"x", "x2"}) {
         std::string tics;
         for (int decade = -6; decade <= 9; ++decade)
-            for (const int step : {1, 2, 5}) tics += textf("%s%g", tics.empty() ? "" : ",", step * std::pow(10.0, decade));
+            for (const int step : steps) tics += textf("%s%g", tics.empty() ? "" : ",", step * std::pow(10.0, decade));
         text += std::string("set ") + axis + "tics (" + tics + ")\n";
     }
     text += textf("set ylabel \"blocks\"\nset logscale y 10\nset yrange [0.7:%.9g]\nset style fill solid 0.8 noborder\nunset key\n",
@@ -184,7 +187,7 @@ std::string loadPlotCommands(const RunOptions &options, const RunReport &report)
         const double us = figure.nanoseconds / 1000.0;
         text += textf("set arrow from %.9g,0.7 to %.9g,%.9g nohead lw 1.5 dt 2 lc rgb '#c0392b' front\n", us, us, height);
         // Each line is shorter than the one to its left, so that no label is crossed.
-        text += textf("set label \" %s %.1f us\" at %.9g,%.9g left tc rgb '#c0392b' front\n", figure.name, us, us, height);
+        text += textf("set label \" %s %.4g us\" at %.9g,%.9g left tc rgb '#c0392b' front\n", figure.name, us, us, height);
         height /= most > 100.0 ? 1.9 : 1.4;
     }
     return text + "plot $data using (sqrt($1*$2)):3:1:2:(0.7):($3>0?$3:0.7) with boxxyerror lc rgb '#1f6fb4'\n";
