@@ -39,7 +39,7 @@ VXCOMN_RT Onset findOnset(OnsetDetector &detector, const float *samples, int cou
             detector.minimum = x;
             detector.minimumIndex = detector.sampleIndex;
         }
-        if (detector.sampleIndex > 2 * window) {
+        if (detector.sampleIndex > 2 * int64_t{window}) {
             const float up = detector.maximum / detector.delayedMaximum, down = detector.minimum / detector.delayedMinimum;
             if (detector.maximumIndex < detector.minimumIndex) {
                 if (up > kFirstGrowth && down > kSecondGrowth) return {true, detector.maximumIndex, detector.maximum};
