@@ -68,6 +68,7 @@ HostInstance::HostInstance(const Options &options) {
 }
 
 HostInstance::~HostInstance() {
+    *engine_ = MockEngine();  // the test's hooks may look at objects of the test that are gone by now
     if (handle != nullptr) VXDSPAPI_FreeLibrary(handle);
     *engine_ = MockEngine();
 }

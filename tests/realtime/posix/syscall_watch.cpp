@@ -37,7 +37,7 @@ void onSystemCall(int, siginfo_t *info, void *) {
 }  // namespace
 
 WatchNeeds watchNeeds() {
-    return {.warmBlocks = 0, .watchedBlocks = 2000};
+    return {.warmBlocks = 0, .watchedBlocks = 500};
 }
 
 void beginWatch() {
