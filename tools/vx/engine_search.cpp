@@ -1,6 +1,8 @@
 // SPDX-License-Identifier: MIT
 #include "tools/vx/engine_search.h"
 
+#include <VXDSPAPI.h>
+
 #include <filesystem>
 #include <vector>
 
@@ -21,7 +23,8 @@ std::vector<fs::path> placesFor(const std::string &module) {
         folders.emplace_back();
     } else {
         folders.push_back(programFolder());
-        if (libraryFolder() != programFolder()) folders.push_back(libraryFolder());
+        const fs::path library = folderOfCode(reinterpret_cast<const void *>(VXDSPAPI_GetProcessFuncAddress()));
+        if (library != programFolder()) folders.push_back(library);
         folders.push_back(moduleSystemFolder());
     }
     std::vector<fs::path> places;

@@ -38,9 +38,9 @@ bool isTerminal(std::FILE *stream);
 int terminalWidth(std::FILE *stream);
 unsigned long processId();
 
-// The folders of this program and of the library that it is linked to.
+// The folders of this program and of the module that a piece of code lies in.
 std::filesystem::path programFolder();
-std::filesystem::path libraryFolder();
+std::filesystem::path folderOfCode(const void *code);
 
 // The names under which this platform looks for the module `name` ("X.dll"), first to last.
 std::vector<std::string> moduleFileNames(const std::string &name);

@@ -1,7 +1,6 @@
 // SPDX-License-Identifier: MIT
 #include "tools/vx/system.h"
 
-#include <VXDSPAPI.h>
 #include <dlfcn.h>
 #include <spawn.h>
 #include <sys/ioctl.h>
@@ -74,9 +73,9 @@ fs::path programFolder() {
     return fs::read_symlink("/proc/self/exe", ignored).parent_path();
 }
 
-fs::path libraryFolder() {
+fs::path folderOfCode(const void *code) {
     Dl_info info = {};
-    if (dladdr(reinterpret_cast<void *>(&VXDSPAPI_Process), &info) == 0 || info.dli_fname == nullptr) return {};
+    if (dladdr(code, &info) == 0 || info.dli_fname == nullptr) return {};
     std::error_code ignored;
     return fs::absolute(info.dli_fname, ignored).parent_path();
 }

@@ -1,7 +1,6 @@
 // SPDX-License-Identifier: MIT
 #include "tools/vx/system.h"
 
-#include <VXDSPAPI.h>
 #include <fcntl.h>
 #include <io.h>
 #include <windows.h>
@@ -102,10 +101,10 @@ fs::path programFolder() {
     return pathOfModule(nullptr).parent_path();
 }
 
-fs::path libraryFolder() {
+fs::path folderOfCode(const void *code) {
     HMODULE module = nullptr;
     const DWORD flags = GET_MODULE_HANDLE_EX_FLAG_FROM_ADDRESS | GET_MODULE_HANDLE_EX_FLAG_UNCHANGED_REFCOUNT;
-    const auto address = reinterpret_cast<LPCWSTR>(VXDSPAPI_GetProcessFuncAddress());
+    const auto address = static_cast<LPCWSTR>(code);
     return GetModuleHandleExW(flags, address, &module) != 0 ? pathOfModule(module).parent_path() : fs::path();
 }
 
