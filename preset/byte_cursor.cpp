@@ -34,4 +34,24 @@ void ByteCursor::refill(size_t count) {
     left_ += source_->readAt(here + left_, window_.get() + left_, goal - left_);
 }
 
+void ByteWriter::zeros(size_t count) {
+    bytes_.resize(bytes_.size() + count);
+}
+
+void ByteWriter::put(size_t position, std::span<const uint8_t> bytes) {
+    if (bytes.empty()) return;
+    if (bytes_.size() < position + bytes.size()) bytes_.resize(position + bytes.size());
+    std::memcpy(bytes_.data() + position, bytes.data(), bytes.size());
+}
+
+void ByteWriter::putU32(size_t position, uint32_t value) {
+    ByteWriter word;
+    word.u32(value);
+    put(position, word.bytes_);
+}
+
+void ByteWriter::number(uint32_t value, size_t size) {
+    for (size_t i = 0; i < size; ++i) bytes_.push_back(static_cast<uint8_t>(value >> 8 * i));
+}
+
 }  // namespace vxcomn

@@ -103,33 +103,23 @@ class ByteWriter {
   public:
     size_t position() const noexcept { return bytes_.size(); }
 
-    void u8(uint8_t value) { bytes_.push_back(value); }
+    void u8(uint8_t value) { number(value, 1); }
     void u16(uint16_t value) { number(value, 2); }
     void u32(uint32_t value) { number(value, 4); }
     void i32(int32_t value) { u32(static_cast<uint32_t>(value)); }
     void f32(float value) { u32(std::bit_cast<uint32_t>(value)); }
-    void bytes(std::span<const uint8_t> bytes) { bytes_.insert(bytes_.end(), bytes.begin(), bytes.end()); }
-    void zeros(size_t count) { bytes_.resize(bytes_.size() + count); }
+    void bytes(std::span<const uint8_t> bytes) { put(position(), bytes); }
+    void zeros(size_t count);
 
     // Overwrites bytes from `position` on, and grows the image with zeros as far as that takes.
-    void put(size_t position, std::span<const uint8_t> bytes) {
-        if (bytes.empty()) return;
-        if (bytes_.size() < position + bytes.size()) bytes_.resize(position + bytes.size());
-        std::memcpy(bytes_.data() + position, bytes.data(), bytes.size());
-    }
-    void putU32(size_t position, uint32_t value) {
-        ByteWriter word;
-        word.u32(value);
-        put(position, word.bytes_);
-    }
+    void put(size_t position, std::span<const uint8_t> bytes);
+    void putU32(size_t position, uint32_t value);
 
     std::span<const uint8_t> view() const noexcept { return bytes_; }
     std::vector<uint8_t> release() { return std::move(bytes_); }
 
   private:
-    void number(uint32_t value, int size) {
-        for (int i = 0; i < size; ++i) bytes_.push_back(static_cast<uint8_t>(value >> 8 * i));
-    }
+    void number(uint32_t value, size_t size);
 
     std::vector<uint8_t> bytes_;
 };

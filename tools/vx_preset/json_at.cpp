@@ -81,7 +81,9 @@ std::optional<JsonAt> JsonAt::optional(const char *name) const {
     if (!value_->is_object()) expected("an object");
     const auto found = value_->find(name);
     if (found == value_->end()) return std::nullopt;
-    return at("." + std::string(name), *found);
+    std::string step(1, '.');
+    step += name;
+    return at(step, *found);
 }
 
 void JsonAt::only(std::initializer_list<const char *> names) const {
