@@ -24,8 +24,9 @@ using Bytes = std::vector<uint8_t>;
 
 class Corpus {
   public:
-    Corpus(const fs::path &root, const std::string &target) : folder_(root / target), dictionary_(root / (target + ".dict")) {
+    Corpus(const fs::path &root, const std::string &target) : folder_(root / target) {
         fs::create_directories(folder_);
+        dictionary_.open(root / (target + ".dict"));
     }
     void seed(const Bytes &bytes) {
         std::ofstream out(folder_ / ("seed-" + std::to_string(seeds_++)), std::ios::binary);

@@ -5,6 +5,7 @@
 #include <charconv>
 #include <cmath>
 #include <limits>
+#include <string_view>
 
 #include "tools/vx_preset/failure.h"
 
@@ -18,6 +19,12 @@ int digitOf(char c) {
     if (c >= 'a' && c <= 'f') return c - 'a' + 10;
     if (c >= 'A' && c <= 'F') return c - 'A' + 10;
     return -1;
+}
+
+std::string joined(std::initializer_list<std::string_view> pieces) {
+    std::string text;
+    for (const std::string_view piece : pieces) text += piece;
+    return text;
 }
 
 // A value as a message shows it.
@@ -81,9 +88,7 @@ std::optional<JsonAt> JsonAt::optional(const char *name) const {
     if (!value_->is_object()) expected("an object");
     const auto found = value_->find(name);
     if (found == value_->end()) return std::nullopt;
-    std::string step(1, '.');
-    step += name;
-    return at(step, *found);
+    return at(joined({".", name}), *found);
 }
 
 void JsonAt::only(std::initializer_list<const char *> names) const {
@@ -98,7 +103,7 @@ void JsonAt::only(std::initializer_list<const char *> names) const {
 std::vector<JsonAt> JsonAt::items() const {
     if (!value_->is_array()) expected("a list");
     std::vector<JsonAt> list;
-    for (size_t i = 0; i < value_->size(); ++i) list.push_back(at("[" + std::to_string(i) + "]", (*value_)[i]));
+    for (size_t i = 0; i < value_->size(); ++i) list.push_back(at(joined({"[", std::to_string(i), "]"}), (*value_)[i]));
     return list;
 }
 
@@ -144,7 +149,7 @@ std::vector<uint8_t> JsonAt::hex() const {
     std::vector<uint8_t> bytes(digits.size() / 2);
     for (size_t i = 0; i < digits.size(); ++i) {
         const int digit = digitOf(digits[i]);
-        if (digit < 0) fail("'" + digits.substr(i, 1) + "' at digit " + std::to_string(i), "hexadecimal digits");
+        if (digit < 0) fail(joined({"'", digits.substr(i, 1), "' at digit ", std::to_string(i)}), "hexadecimal digits");
         bytes[i / 2] = static_cast<uint8_t>(bytes[i / 2] << 4 | digit);
     }
     return bytes;
