@@ -10,6 +10,8 @@ namespace {
 
 }  // namespace
 
-[[gnu::section("RT_CODE")]] uint32_t *threadRandomWord() noexcept { return &word; }
+[[gnu::section("RT_CODE")]] uint32_t *threadRandomWord() noexcept {
+    return &word;
+}
 
 }  // namespace vxcomn

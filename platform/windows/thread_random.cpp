@@ -1,9 +1,9 @@
 // SPDX-License-Identifier: MIT
 //
-// The compiler keeps a thread_local in memory that it allocates at the first use, so this word is put by hand into what the system's
-// loader copies for each thread: sections named .tls$..., between the markers of the C runtime (.tls and .tls$ZZZ). Its address is
-// that of the thread's copy for this module, found through the thread block at gs:[0x58] and the module's index, plus the word's
-// place in the section.
+// The compiler keeps a thread_local in memory that it allocates at the first use, so this word is put by hand into what the
+// system's loader copies for each thread: sections named .tls$..., between the markers of the C runtime (.tls and .tls$ZZZ). Its
+// address is that of the thread's copy for this module, found through the thread block at gs:[0x58] and the module's index, plus
+// the word's place in the section.
 #include "platform/thread_random.h"
 
 extern "C" {

@@ -113,7 +113,8 @@ TEST_CASE("a reader keeps the old file while it is replaced") {
 
 TEST_CASE("listing finds names by pattern and tells folders from files") {
     const Folder folder;
-    for (const char *name : {"a.bin", "ab.bin", "c.txt", "[x].bin"}) REQUIRE(writeWholeFile(folder.of(name), {}, FileWrite::fresh) == 0);
+    for (const char *name : {"a.bin", "ab.bin", "c.txt", "[x].bin"})
+        REQUIRE(writeWholeFile(folder.of(name), {}, FileWrite::fresh) == 0);
     std::filesystem::create_directory(folder.path / "d.bin");
     CHECK(names(findFiles(folder.of("*.bin"))) == std::vector<std::string>{"[x].bin", "a.bin", "ab.bin", "d.bin/"});
     CHECK(names(findFiles(folder.of("a?.bin"))) == std::vector<std::string>{"ab.bin"});

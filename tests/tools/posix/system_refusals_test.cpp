@@ -66,8 +66,7 @@ TEST_CASE_FIXTURE(ShellFixture, "FLAC is read and written, in 24 bits if nothing
 }
 
 TEST_CASE_FIXTURE(ShellFixture, "an interrupted run leaves no file") {
-    const Outcome outcome =
-        shell("\"$vx\" run in.wav -q --loop 10000 --bits 16 -o long.wav & sleep 0.5; kill -TERM $!; wait $!");
+    const Outcome outcome = shell("\"$vx\" run in.wav -q --loop 10000 --bits 16 -o long.wav & sleep 0.5; kill -TERM $!; wait $!");
     CHECK(outcome.status == 4);
     CHECK(has(outcome.errors, "interrupted; nothing was written"));
     CHECK_FALSE(exists("long.wav"));
