@@ -49,7 +49,13 @@ VXCOMN_ENGINE_API VXEngineHandle VXDSPAPI_Initialize(uint32_t hardware, const ch
     engine.context = context;
     engine.hostType = hostType;
     if (engine.onInitialize) engine.onInitialize(context, callback);
-    return engine.decline ? nullptr : new Instance();
+    if (engine.decline) return nullptr;
+#ifdef MOCK_BARE
+    static Instance only;  // nobody could free it
+    return &only;
+#else
+    return new Instance();
+#endif
 }
 #endif
 
