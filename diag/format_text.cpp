@@ -96,7 +96,7 @@ class Formatter {
                 WideString text = argument.text();
                 if (d.precision >= 0 && text.size() > static_cast<size_t>(d.precision))
                     text.resize(static_cast<size_t>(d.precision));
-                pad(d, std::move(text));
+                pad(d, text);
                 break;
             }
             case FormatArgument::Kind::real:
@@ -111,7 +111,7 @@ class Formatter {
         }
     }
 
-    void pad(const Directive &d, WideString text) {
+    void pad(const Directive &d, const WideString &text) {
         const auto width = static_cast<size_t>(d.width);
         const size_t blanks = text.size() < width ? width - text.size() : 0;
         const bool left = d.flags.find('-') != std::string::npos;
