@@ -133,10 +133,10 @@ TEST_CASE("component -1 changes both rates without touching outputFormat; the en
 }
 
 TEST_CASE("components reach the engine with both block functions held up, and the highest id is kept") {
+    std::vector<int> held;  // outlives the host, whose end the engine sees too
     HostInstance host;
     setFormats(host, formatOf(0x3), formatOf(0x3));
     host.engine().calls.clear();
-    std::vector<int> held;
     host.engine().onControl = [&] {
         held.push_back(host.context().processStop);
         held.push_back(host.context().recordStop);
