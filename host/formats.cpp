@@ -28,6 +28,8 @@ bool isZero(const IOFormat &format) {
 uint32_t setIOFormat(VXHandle handle, IOFormat *input, IOFormat *output) {
     LibraryContext &context = contextOf(handle);
     const TraceScope scope(traceOf(context), VX_TEXT("VXDSPAPI_SetIOFormat"));
+    // The caller keeps blocks out; other control calls, such as the readout of an analyser, are kept out here.
+    const std::lock_guard lock(controlLock(&context));
     if (sameFormat(*input, context.inputFormat) && sameFormat(*output, context.outputFormat)) {
         hostLog(context, VX_TEXT("Format hasn't changed\n"));
         return 0;
@@ -40,7 +42,6 @@ uint32_t setIOFormat(VXHandle handle, IOFormat *input, IOFormat *output) {
     createMeasuringObjects(context);
     uint32_t result = 0;
     if (context.engineSetIOFormat != nullptr) result = context.engineSetIOFormat(handle, input, output);
-    const std::lock_guard lock(controlLock(&context));
     if (isstInUse(context) && context.isstModule->engineSetIOFormat != nullptr) {
         result = context.isstModule->engineSetIOFormat(context.isstHandle, input, output);
     }
