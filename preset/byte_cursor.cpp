@@ -22,15 +22,22 @@ bool ByteCursor::seek(uint64_t position) {
 
 void ByteCursor::refill(size_t count) {
     if (source_ == nullptr) return;
-    if (!window_) window_ = std::make_unique_for_overwrite<uint8_t[]>(kWindowBytes);
-    // What is left moves to the window's front, and the source fills the rest.
     const uint64_t here = position();
-    if (left_ > 0) std::memmove(window_.get(), next_, left_);
-    windowStart_ = here;
-    begin_ = next_ = window_.get();
     // Up to the expected end in one go; behind it by whole windows, so that no input makes a file be read word by word.
     const uint64_t ahead = expected_ > here + left_ ? expected_ - here : kWindowBytes;
     const auto goal = static_cast<size_t>(std::min<uint64_t>(std::max<uint64_t>(count, ahead), kWindowBytes));
+    // What is left moves to the window's front, and the source fills the rest. The window is no larger than what is read at once:
+    // pages of a large one would cost more than reading a small preset does.
+    if (capacity_ < goal) {
+        auto larger = std::make_unique_for_overwrite<uint8_t[]>(goal);
+        if (left_ > 0) std::memcpy(larger.get(), next_, left_);
+        window_ = std::move(larger);
+        capacity_ = goal;
+    } else if (left_ > 0) {
+        std::memmove(window_.get(), next_, left_);
+    }
+    windowStart_ = here;
+    begin_ = next_ = window_.get();
     left_ += source_->readAt(here + left_, window_.get() + left_, goal - left_);
 }
 

@@ -96,6 +96,7 @@ class ByteCursor {
     uint64_t expected_ = 0;
     ByteSource *source_ = nullptr;  // null over memory
     std::unique_ptr<uint8_t[]> window_;
+    size_t capacity_ = 0;
 };
 
 // Appends to a growing image.
