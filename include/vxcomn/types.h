@@ -20,11 +20,13 @@ typedef wchar_t VXWCHAR;
 #define VX_TEXT_JOIN(text) L##text
 #define VXCOMN_EXPORT __declspec(dllexport)
 #define VXCOMN_IMPORT __declspec(dllimport)
+#define VXCOMN_SYSTEM_HAS_COM 1 /* the system's headers declare what com_types.h declares elsewhere */
 #else
 typedef char16_t VXWCHAR;
 #define VX_TEXT_JOIN(text) u##text
 #define VXCOMN_EXPORT __attribute__((visibility("default")))
 #define VXCOMN_IMPORT
+#define VXCOMN_SYSTEM_HAS_COM 0
 #endif
 
 /* A literal of 16-bit text. */
