@@ -32,6 +32,7 @@ class Waitable {
   protected:
     Waitable() noexcept;
     explicit Waitable(std::unique_ptr<WaitObject> object) noexcept;
+    void adopt(std::unique_ptr<WaitObject> object) noexcept;
 
   private:
     std::unique_ptr<WaitObject> object_;

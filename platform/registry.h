@@ -16,6 +16,9 @@
 
 namespace vxcomn {
 
+class ChangeSignal;
+class SecurityRecord;
+
 enum class RegistryRoot : uint8_t { localMachine = 0, currentUser = 1, users = 2, classesRoot = 3 };
 
 // Numbers as in winnt.h.
@@ -41,11 +44,14 @@ class RegistryKey {
 
     // Opens a key that exists: 0, 2 if there is none, 5 without the right.
     static Status open(RegistryRoot root, WideView path, RegistryAccess access, RegistryKey &key);
-    // Opens a key and makes it, with all above it, where it is missing. `created` (if given) tells whether it was.
-    static Status create(RegistryRoot root, WideView path, RegistryAccess access, RegistryKey &key, bool *created = nullptr);
+    // Opens a key and makes it, with all above it, where it is missing. `created` (if given) tells whether it was; what is made
+    // gets the rights of `security` (security.h), or those of the key above it.
+    static Status create(RegistryRoot root, WideView path, RegistryAccess access, RegistryKey &key, bool *created = nullptr,
+                         const SecurityRecord *security = nullptr);
     // The same, below an open key.
     Status openBelow(WideView path, RegistryAccess access, RegistryKey &key) const;
-    Status createBelow(WideView path, RegistryAccess access, RegistryKey &key, bool *created = nullptr) const;
+    Status createBelow(WideView path, RegistryAccess access, RegistryKey &key, bool *created = nullptr,
+                       const SecurityRecord *security = nullptr) const;
 
     explicit operator bool() const noexcept;
     void close() noexcept;
@@ -77,6 +83,7 @@ class RegistryKey {
     Status values(std::vector<WideString> &names) const;
 
   private:
+    friend ChangeSignal;
     struct Impl;
     std::unique_ptr<Impl> impl_;
 };

@@ -89,6 +89,10 @@ Waitable::Waitable(Waitable &&) noexcept = default;
 Waitable &Waitable::operator=(Waitable &&) noexcept = default;
 Waitable::~Waitable() = default;
 
+void Waitable::adopt(std::unique_ptr<WaitObject> object) noexcept {
+    object_ = std::move(object);
+}
+
 Event::Event(EventReset reset, bool set) : Waitable(std::make_unique<EventObject>(reset, set)) {}
 
 void Event::set() noexcept {

@@ -11,6 +11,7 @@
 #include <unistd.h>
 
 #include "platform/environment.h"
+#include "platform/posix/open_to_all.h"
 #include "platform/posix/system_status.h"
 
 namespace vxcomn {
@@ -24,7 +25,9 @@ Status makeFolders(const std::string &path) {
         end = path.find('/', end);
         const std::string folder = path.substr(0, end);
         if (end != std::string::npos) ++end;
-        if (mkdir(folder.c_str(), 0777) == 0 || errno == EEXIST) continue;
+        const bool isLast = end == std::string::npos;
+        // The folders above the machine's own are the user's, made as the user makes folders.
+        if (isLast ? makeFolderForAll(folder) : mkdir(folder.c_str(), 0777) == 0 || errno == EEXIST) continue;
         // Above the root there may be folders that we see but must not write in.
         const int reason = errno;
         struct stat there;

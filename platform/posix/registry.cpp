@@ -1,9 +1,9 @@
 // SPDX-License-Identifier: MIT
 //
-// The registry on the machine folder's store: what each call asks of the tables. A key handle holds the key's number and the
-// identity of the file that gave it, so a call costs one statement and no walk.
+// The registry on the machine folder's store: what each call asks of the tables.
 #include "platform/registry.h"
 
+#include "platform/posix/registry_key.h"
 #include "platform/posix/registry_store.h"
 
 namespace vxcomn {
@@ -11,9 +11,6 @@ namespace {
 
 constexpr size_t kMaxKeyNameUnits = 255;
 constexpr size_t kMaxValueNameUnits = 16383;
-
-// The rights inside RegistryAccess that a call asks for.
-enum Right : uint32_t { kQueryValue = 1, kSetValue = 2, kEnumerate = 8 };
 
 int64_t rootKey(RegistryRoot root) noexcept {
     return static_cast<int64_t>(root) + 1;
@@ -44,48 +41,63 @@ Status absentOrDeleted(StoreConnection &store, int64_t key) {
     return keyExists(store, key) ? status::fileNotFound : status::keyDeleted;
 }
 
-// Walks down from `key`; `depth` tells how many parts there are.
-void walk(StoreConnection &store, const std::vector<WideView> &parts, int64_t &key, size_t &depth) {
-    for (depth = 0; depth < parts.size(); ++depth) {
+// Walks down from the chain's end, as far as there are keys, and lengthens the chain by them. Returns how many parts that were.
+size_t walk(StoreConnection &store, const std::vector<WideView> &parts, KeyChain &chain) {
+    for (size_t depth = 0; depth < parts.size(); ++depth) {
         const WideString folded = foldCase(parts[depth]);
         Statement find = store(Query::findKey);
-        if (!find.bind(1, key).bind(2, WideView(folded)).next()) return;
-        key = find.number(0);
+        if (!find.bind(1, chain.back()).bind(2, WideView(folded)).next()) return depth;
+        chain.push_back(find.number(0));
     }
+    return parts.size();
 }
 
-// Finds a key from `above`.
-Status findKey(StoreConnection &store, int64_t above, const std::vector<WideView> &parts, int64_t &key) {
-    size_t depth = 0;
-    key = above;
-    walk(store, parts, key, depth);
+// Finds a key from the chain's end. The chain is its own only if that is ok.
+Status findKey(StoreConnection &store, const std::vector<WideView> &parts, KeyChain &chain) {
+    const int64_t above = chain.back();
+    const bool found = walk(store, parts, chain) == parts.size();
     // A key that was reached by its name is there; whether the start is must be asked for.
-    if (depth == parts.size() && depth > 0) return status::ok;
+    if (found && !parts.empty()) return status::ok;
     if (!keyExists(store, above)) return status::keyDeleted;
-    return depth == parts.size() ? status::ok : status::fileNotFound;
+    return found ? status::ok : status::fileNotFound;
 }
 
-Status makeKey(StoreConnection &store, int64_t above, const std::vector<WideView> &parts, int64_t &key, bool &created) {
+Status makeKey(StoreConnection &store, const std::vector<WideView> &parts, KeyChain &chain, bool &created) {
     created = false;
-    if (const Status status = findKey(store, above, parts, key); status != status::fileNotFound) return status;
+    KeyChain found = chain;
+    if (const Status status = findKey(store, parts, found); status != status::fileNotFound) {
+        chain = std::move(found);
+        return status;
+    }
     StoreTransaction transaction(store);
-    size_t depth = 0;
-    key = above;
-    walk(store, parts, key, depth);
-    if (!keyExists(store, key)) return status::keyDeleted;
+    size_t depth = walk(store, parts, chain);
+    if (!keyExists(store, chain.back())) return status::keyDeleted;
+    const KeyChain above = chain;
     for (; depth < parts.size(); ++depth, created = true) {
         const WideString folded = foldCase(parts[depth]);
-        store(Query::addKey).bind(1, key).bind(2, WideView(folded)).bind(3, parts[depth]).run();
-        key = store.lastKey();
+        store(Query::addKey).bind(1, chain.back()).bind(2, WideView(folded)).bind(3, parts[depth]).run();
+        chain.push_back(store.lastKey());
     }
     transaction.commit();
+    if (created) store.noteChange(above, ChangeKind::keys);
     return status::ok;
 }
 
-// Deletes what is below `key`, and the key itself unless it is to be kept.
-void deleteTree(StoreConnection &store, int64_t key, bool keep) {
+// Deletes what is below the chain's end, and that key itself unless it is to be kept, and ends the transaction.
+void deleteTree(StoreConnection &store, StoreTransaction &transaction, const KeyChain &chain, bool keep) {
+    const int64_t key = chain.back();
+    KeyChain gone;
+    {
+        Statement list = store(Query::listTree);
+        for (list.bind(1, key); list.next();) gone.push_back(list.number(0));
+    }
     store(Query::deleteValuesOfTree).bind(1, key).run();
     store(Query::deleteKeysOfTree).bind(1, key).bind(2, keep ? key : int64_t{0}).run();
+    transaction.commit();
+    // Who watches a key that is gone learns it, whatever it watches for; above it a key is missing now, and in one that was kept
+    // the values are.
+    store.noteChange(gone, ChangeKind::values);
+    store.noteChange(chain, keep ? ChangeKind::values : ChangeKind::keys);
 }
 
 Status listNames(StoreConnection &store, Query query, int64_t key, std::vector<WideString> &names) {
@@ -100,18 +112,13 @@ Status listNames(StoreConnection &store, Query query, int64_t key, std::vector<W
 
 }  // namespace
 
-struct RegistryKey::Impl {
-    int64_t store;  // identity of the file
-    int64_t key;
-    uint32_t access;
+namespace {
 
-    bool may(Right right) const noexcept { return (access & right) != 0; }
-    bool isOf(const StoreConnection &connection) const { return connection.identity() == store; }
+bool isOf(int64_t identity, const StoreConnection &store) {
+    return store.identity() == identity;
+}
 
-    static void hold(const StoreConnection &store, int64_t found, RegistryAccess access, RegistryKey &key) {
-        key.impl_ = std::make_unique<Impl>(Impl{store.identity(), found, static_cast<uint32_t>(access)});
-    }
-};
+}  // namespace
 
 RegistryKey::RegistryKey() noexcept = default;
 RegistryKey::RegistryKey(RegistryKey &&) noexcept = default;
@@ -122,22 +129,23 @@ Status RegistryKey::open(RegistryRoot root, WideView path, RegistryAccess access
     std::vector<WideView> parts;
     if (!splitPath(path, parts)) return status::invalidParameter;
     return runInStore(false, [&](StoreConnection &store) {
-        int64_t found = 0;
-        const Status status = findKey(store, rootKey(root), parts, found);
-        if (status == status::ok) Impl::hold(store, found, access, key);
+        KeyChain chain = {rootKey(root)};
+        const Status status = findKey(store, parts, chain);
+        if (status == status::ok) key.impl_ = std::make_unique<Impl>(Impl{store.identity(), chain, static_cast<uint32_t>(access)});
         return status;
     });
 }
 
-Status RegistryKey::create(RegistryRoot root, WideView path, RegistryAccess access, RegistryKey &key, bool *created) {
+Status RegistryKey::create(RegistryRoot root, WideView path, RegistryAccess access, RegistryKey &key, bool *created,
+                           const SecurityRecord *) {
     std::vector<WideView> parts;
     if (!splitPath(path, parts)) return status::invalidParameter;
     return runInStore(true, [&](StoreConnection &store) {
-        int64_t found = 0;
+        KeyChain chain = {rootKey(root)};
         bool isNew = false;
-        const Status status = makeKey(store, rootKey(root), parts, found, isNew);
+        const Status status = makeKey(store, parts, chain, isNew);
         if (status != status::ok) return status;
-        Impl::hold(store, found, access, key);
+        key.impl_ = std::make_unique<Impl>(Impl{store.identity(), chain, static_cast<uint32_t>(access)});
         if (created != nullptr) *created = isNew;
         return status;
     });
@@ -148,25 +156,26 @@ Status RegistryKey::openBelow(WideView path, RegistryAccess access, RegistryKey 
     if (!impl_) return status::invalidHandle;
     if (!splitPath(path, parts)) return status::invalidParameter;
     return runInStore(false, [&, above = *impl_](StoreConnection &store) {
-        if (!above.isOf(store)) return status::keyDeleted;
-        int64_t found = 0;
-        const Status status = findKey(store, above.key, parts, found);
-        if (status == status::ok) Impl::hold(store, found, access, key);
+        if (!isOf(above.store, store)) return status::keyDeleted;
+        KeyChain chain = above.chain;
+        const Status status = findKey(store, parts, chain);
+        if (status == status::ok) key.impl_ = std::make_unique<Impl>(Impl{store.identity(), chain, static_cast<uint32_t>(access)});
         return status;
     });
 }
 
-Status RegistryKey::createBelow(WideView path, RegistryAccess access, RegistryKey &key, bool *created) const {
+Status RegistryKey::createBelow(WideView path, RegistryAccess access, RegistryKey &key, bool *created,
+                                const SecurityRecord *) const {
     std::vector<WideView> parts;
     if (!impl_) return status::invalidHandle;
     if (!splitPath(path, parts)) return status::invalidParameter;
     return runInStore(true, [&, above = *impl_](StoreConnection &store) {
-        if (!above.isOf(store)) return status::keyDeleted;
-        int64_t found = 0;
+        if (!isOf(above.store, store)) return status::keyDeleted;
+        KeyChain chain = above.chain;
         bool isNew = false;
-        const Status status = makeKey(store, above.key, parts, found, isNew);
+        const Status status = makeKey(store, parts, chain, isNew);
         if (status != status::ok) return status;
-        Impl::hold(store, found, access, key);
+        key.impl_ = std::make_unique<Impl>(Impl{store.identity(), chain, static_cast<uint32_t>(access)});
         if (created != nullptr) *created = isNew;
         return status;
     });
@@ -184,10 +193,10 @@ Status RegistryKey::query(WideView name, RegistryValue &value) const {
     if (!impl_->may(kQueryValue)) return status::accessDenied;
     if (!isValueName(name)) return status::invalidParameter;
     return runInStore(false, [&](StoreConnection &store) {
-        if (!impl_->isOf(store)) return status::keyDeleted;
+        if (!isOf(impl_->store, store)) return status::keyDeleted;
         const WideString folded = foldCase(name);
         Statement read = store(Query::readValue);
-        if (!read.bind(1, impl_->key).bind(2, WideView(folded)).next()) return absentOrDeleted(store, impl_->key);
+        if (!read.bind(1, impl_->key()).bind(2, WideView(folded)).next()) return absentOrDeleted(store, impl_->key());
         const std::span<const uint8_t> data = read.bytes(1);
         value.data.assign(data.begin(), data.end());
         value.type = static_cast<RegistryType>(read.number(0));
@@ -200,11 +209,13 @@ Status RegistryKey::set(WideView name, RegistryType type, std::span<const uint8_
     if (!impl_->may(kSetValue)) return status::accessDenied;
     if (!isValueName(name)) return status::invalidParameter;
     return runInStore(true, [&](StoreConnection &store) {
-        if (!impl_->isOf(store)) return status::keyDeleted;
+        if (!isOf(impl_->store, store)) return status::keyDeleted;
         const WideString folded = foldCase(name);
         Statement write = store(Query::writeValue);
-        write.bind(1, impl_->key).bind(2, WideView(folded)).bind(3, name).bind(4, static_cast<int64_t>(type)).bind(5, data).run();
-        return store.changes() == 1 ? status::ok : status::keyDeleted;
+        write.bind(1, impl_->key()).bind(2, WideView(folded)).bind(3, name).bind(4, static_cast<int64_t>(type)).bind(5, data).run();
+        if (store.changes() != 1) return status::keyDeleted;
+        store.noteChange(impl_->chain, ChangeKind::values);
+        return status::ok;
     });
 }
 
@@ -213,10 +224,12 @@ Status RegistryKey::deleteValue(WideView name) {
     if (!impl_->may(kSetValue)) return status::accessDenied;
     if (!isValueName(name)) return status::invalidParameter;
     return runInStore(true, [&](StoreConnection &store) {
-        if (!impl_->isOf(store)) return status::keyDeleted;
+        if (!isOf(impl_->store, store)) return status::keyDeleted;
         const WideString folded = foldCase(name);
-        store(Query::deleteValue).bind(1, impl_->key).bind(2, WideView(folded)).run();
-        return store.changes() == 1 ? status::ok : absentOrDeleted(store, impl_->key);
+        store(Query::deleteValue).bind(1, impl_->key()).bind(2, WideView(folded)).run();
+        if (store.changes() != 1) return absentOrDeleted(store, impl_->key());
+        store.noteChange(impl_->chain, ChangeKind::values);
+        return status::ok;
     });
 }
 
@@ -225,13 +238,12 @@ Status RegistryKey::deleteBelow(WideView path) {
     if (!impl_) return status::invalidHandle;
     if (!splitPath(path, parts) || parts.empty()) return status::invalidParameter;
     return runInStore(true, [&](StoreConnection &store) {
-        if (!impl_->isOf(store)) return status::keyDeleted;
+        if (!isOf(impl_->store, store)) return status::keyDeleted;
         StoreTransaction transaction(store);
-        int64_t key = 0;
-        if (const Status status = findKey(store, impl_->key, parts, key); status != status::ok) return status;
-        if (store(Query::hasKeysBelow).bind(1, key).next()) return status::accessDenied;
-        deleteTree(store, key, false);
-        transaction.commit();
+        KeyChain chain = impl_->chain;
+        if (const Status status = findKey(store, parts, chain); status != status::ok) return status;
+        if (store(Query::hasKeysBelow).bind(1, chain.back()).next()) return status::accessDenied;
+        deleteTree(store, transaction, chain, false);
         return status::ok;
     });
 }
@@ -241,12 +253,11 @@ Status RegistryKey::deleteTreeBelow(WideView path) {
     if (!impl_) return status::invalidHandle;
     if (!splitPath(path, parts)) return status::invalidParameter;
     return runInStore(true, [&](StoreConnection &store) {
-        if (!impl_->isOf(store)) return status::keyDeleted;
+        if (!isOf(impl_->store, store)) return status::keyDeleted;
         StoreTransaction transaction(store);
-        int64_t key = 0;
-        if (const Status status = findKey(store, impl_->key, parts, key); status != status::ok) return status;
-        deleteTree(store, key, parts.empty());
-        transaction.commit();
+        KeyChain chain = impl_->chain;
+        if (const Status status = findKey(store, parts, chain); status != status::ok) return status;
+        deleteTree(store, transaction, chain, parts.empty());
         return status::ok;
     });
 }
@@ -255,7 +266,7 @@ Status RegistryKey::subkeys(std::vector<WideString> &names) const {
     if (!impl_) return status::invalidHandle;
     if (!impl_->may(kEnumerate)) return status::accessDenied;
     return runInStore(false, [&](StoreConnection &store) {
-        return impl_->isOf(store) ? listNames(store, Query::listKeys, impl_->key, names) : status::keyDeleted;
+        return isOf(impl_->store, store) ? listNames(store, Query::listKeys, impl_->key(), names) : status::keyDeleted;
     });
 }
 
@@ -263,7 +274,7 @@ Status RegistryKey::values(std::vector<WideString> &names) const {
     if (!impl_) return status::invalidHandle;
     if (!impl_->may(kQueryValue)) return status::accessDenied;
     return runInStore(false, [&](StoreConnection &store) {
-        return impl_->isOf(store) ? listNames(store, Query::listValues, impl_->key, names) : status::keyDeleted;
+        return isOf(impl_->store, store) ? listNames(store, Query::listValues, impl_->key(), names) : status::keyDeleted;
     });
 }
 

@@ -10,6 +10,7 @@
 #include <sys/stat.h>
 #include <unistd.h>
 
+#include "platform/posix/open_to_all.h"
 #include "platform/posix/registry_store.h"
 
 namespace vxcomn {
@@ -50,6 +51,7 @@ constexpr const char *kQueries[static_cast<int>(Query::count)] = {
     "SELECT name FROM entries WHERE key = ?1 ORDER BY id",
     VXCOMN_KEYS_OF_TREE "DELETE FROM entries WHERE key IN tree",
     VXCOMN_KEYS_OF_TREE "DELETE FROM keys WHERE id IN tree AND id <> ?2",
+    VXCOMN_KEYS_OF_TREE "SELECT id FROM tree",
 };
 
 #undef VXCOMN_KEYS_OF_TREE
@@ -129,6 +131,8 @@ StoreConnection::~StoreConnection() {
 }
 
 void StoreConnection::open() {
+    // SQLite gives the journals the permissions of the file.
+    if (!openForAll(path_)) throw StoreError{SQLITE_CANTOPEN};
     check(sqlite3_open_v2(path_.c_str(), &database_, SQLITE_OPEN_READWRITE | SQLITE_OPEN_CREATE | SQLITE_OPEN_NOMUTEX, nullptr));
     sqlite3_extended_result_codes(database_, 1);
     sqlite3_busy_handler(database_, waitForOthers, nullptr);
@@ -180,6 +184,11 @@ void StoreConnection::close() {
 
 Statement StoreConnection::operator()(Query query) {
     return Statement(statements_[static_cast<int>(query)]);
+}
+
+void StoreConnection::publishChanges(ChangeTable &table) noexcept {
+    for (const Change &change : changes_) table.publish(change.keys, change.kind);
+    changes_.clear();
 }
 
 bool StoreConnection::inPlace() const {

@@ -21,6 +21,7 @@
 #include "platform/environment.h"
 #include "platform/posix/descriptor.h"
 #include "platform/posix/machine_root.h"
+#include "platform/posix/open_to_all.h"
 #include "platform/posix/system_status.h"
 
 namespace vxcomn {
@@ -51,7 +52,12 @@ void watchForks() {
                             storeMutex.lock();
                             closeConnection();
                         },
-                        [] { storeMutex.unlock(); }, [] { storeMutex.unlock(); }) == 0;
+                        [] { storeMutex.unlock(); },
+                        [] {
+                            Status ignored;
+                            if (ChangeTable *const table = ChangeTable::get(ignored)) table->forgetMark();
+                            storeMutex.unlock();
+                        }) == 0;
 }
 
 [[gnu::destructor]] void closeAtUnload() {
@@ -68,7 +74,7 @@ std::optional<struct stat> look(const std::string &path) {
 // Held while the file is opened, made or set aside; goes with the process that holds it.
 class FileLock {
   public:
-    explicit FileLock(const std::string &path) : file_(::open(path.c_str(), O_RDWR | O_CREAT | O_CLOEXEC, 0666)) {
+    explicit FileLock(const std::string &path) : file_(openForAll(path)) {
         if (!file_) return;
         while (flock(file_.get(), LOCK_EX) != 0) {
             if (errno != EINTR) {
@@ -106,6 +112,9 @@ void setAside(const std::string &path, const char *reason) {
         if (!look(path + part)) continue;
         if (rename((path + part).c_str(), (aside + part).c_str()) != 0) throw StoreError{SQLITE_READONLY};
     }
+    // Who watches a key of that file has to look for it anew.
+    Status ignored;
+    if (ChangeTable *const table = ChangeTable::get(ignored)) table->publishEverything();
     tell("registry: " + path + " is damaged (" + reason + "); it was set aside as " + aside + " and a fresh one begun");
 }
 
@@ -176,11 +185,33 @@ class Store {
     std::string path_, lockPath_;
 };
 
+// The mark of a write (change_table.h), for a scope.
+class WriteMark {
+  public:
+    explicit WriteMark(ChangeTable *table) noexcept : table_(table) {
+        if (table_ != nullptr) table_->beginWrite();
+    }
+    ~WriteMark() {
+        if (table_ != nullptr) table_->endWrite();
+    }
+    WriteMark(const WriteMark &) = delete;
+    WriteMark &operator=(const WriteMark &) = delete;
+
+  private:
+    ChangeTable *const table_;
+};
+
 Status attempt(Store &store, bool writes, StoreTask &task, bool &again) {
     again = false;
+    // Without the table a write holds all the same; there can be no watchers then either.
+    Status noTable;
+    ChangeTable *const table = writes ? ChangeTable::get(noTable) : nullptr;
+    const WriteMark mark(table);
     try {
         StoreConnection &current = store.current();
+        current.forgetChanges();
         const Status status = task(current);
+        if (table != nullptr) current.publishChanges(*table);
         // Set aside under our hands: what was written went with it.
         again = writes && !current.inPlace();
         return again ? status::badDb : status;

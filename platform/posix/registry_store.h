@@ -15,10 +15,14 @@
 
 #include <cstdint>
 #include <span>
+#include <string>
+#include <vector>
 
 #include <sqlite3.h>
 #include <sys/types.h>
 
+#include "platform/posix/change_table.h"
+#include "platform/posix/registry_key.h"
 #include "platform/status.h"
 #include "platform/text.h"
 
@@ -44,6 +48,7 @@ enum class Query : uint8_t {
     listValues,
     deleteValuesOfTree,
     deleteKeysOfTree,
+    listTree,
     count
 };
 
@@ -90,6 +95,11 @@ class StoreConnection {
     // A random number that this file was given when it was made. Ids of keys count only together with it.
     int64_t identity() const { return identity_; }
 
+    // What a task has committed, so that it is published when the task has returned.
+    void noteChange(const KeyChain &keys, ChangeKind kind) { changes_.push_back({keys, kind}); }
+    void forgetChanges() noexcept { changes_.clear(); }
+    void publishChanges(ChangeTable &table) noexcept;
+
     // Whether the file still is the one at the path. One look at the folder.
     bool inPlace() const;
     // Closing shall leave all files alone, since they are not, or not for long, this connection's own.
@@ -102,7 +112,13 @@ class StoreConnection {
     int64_t askNumber(const char *sql);
     void close();
 
+    struct Change {
+        KeyChain keys;
+        ChangeKind kind;
+    };
+
     std::string path_;
+    std::vector<Change> changes_;
     sqlite3 *database_ = nullptr;
     sqlite3_stmt *statements_[static_cast<int>(Query::count)] = {};
     int64_t identity_ = 0;

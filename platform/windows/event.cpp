@@ -15,6 +15,10 @@ Waitable::Waitable(Waitable &&) noexcept = default;
 Waitable &Waitable::operator=(Waitable &&) noexcept = default;
 Waitable::~Waitable() = default;
 
+void Waitable::adopt(std::unique_ptr<WaitObject> object) noexcept {
+    object_ = std::move(object);
+}
+
 namespace {
 
 std::unique_ptr<WaitObject> makeEvent(EventReset reset, bool set) {

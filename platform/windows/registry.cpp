@@ -3,18 +3,11 @@
 // The system's own registry.
 #include "platform/registry.h"
 
-#include "platform/unique.h"
-#include "platform/windows/sdk.h"
+#include "platform/security.h"
+#include "platform/windows/registry_key.h"
 
 namespace vxcomn {
 namespace {
-
-struct KeyTraits {
-    using Raw = HKEY;
-    static constexpr Raw none = nullptr;
-    static void close(Raw key) noexcept { RegCloseKey(key); }
-};
-using SystemKey = Unique<KeyTraits>;
 
 constexpr size_t kMaxKeyNameUnits = 255;
 constexpr size_t kMaxValueNameUnits = 16383;
@@ -57,34 +50,32 @@ Status collectNames(size_t maxUnits, Next next, std::vector<WideString> &names) 
 
 }  // namespace
 
-struct RegistryKey::Impl {
-    SystemKey key;
+Status RegistryKey::Impl::open(HKEY above, WideView path, RegistryAccess access, RegistryKey &key) {
+    if (!isName(path)) return status::invalidParameter;
+    SystemKey opened;
+    const LSTATUS status = RegOpenKeyExW(above, WideString(path).c_str(), 0, static_cast<REGSAM>(access), opened.put());
+    return take(status, opened, key);
+}
 
-    static Status open(HKEY above, WideView path, RegistryAccess access, RegistryKey &key) {
-        if (!isName(path)) return status::invalidParameter;
-        SystemKey opened;
-        const LSTATUS status = RegOpenKeyExW(above, WideString(path).c_str(), 0, static_cast<REGSAM>(access), opened.put());
-        return take(status, opened, key);
-    }
+Status RegistryKey::Impl::create(HKEY above, WideView path, RegistryAccess access, RegistryKey &key, bool *created,
+                                 const SecurityRecord *security) {
+    if (!isName(path)) return status::invalidParameter;
+    auto *attributes = security != nullptr ? static_cast<SECURITY_ATTRIBUTES *>(security->attributes()) : nullptr;
+    SystemKey opened;
+    DWORD disposition = 0;
+    const LSTATUS status = RegCreateKeyExW(above, WideString(path).c_str(), 0, nullptr, REG_OPTION_NON_VOLATILE,
+                                           static_cast<REGSAM>(access), attributes, opened.put(), &disposition);
+    if (status == ERROR_SUCCESS && created != nullptr) *created = disposition == REG_CREATED_NEW_KEY;
+    return take(status, opened, key);
+}
 
-    static Status create(HKEY above, WideView path, RegistryAccess access, RegistryKey &key, bool *created) {
-        if (!isName(path)) return status::invalidParameter;
-        SystemKey opened;
-        DWORD disposition = 0;
-        const LSTATUS status = RegCreateKeyExW(above, WideString(path).c_str(), 0, nullptr, REG_OPTION_NON_VOLATILE,
-                                               static_cast<REGSAM>(access), nullptr, opened.put(), &disposition);
-        if (status == ERROR_SUCCESS && created != nullptr) *created = disposition == REG_CREATED_NEW_KEY;
-        return take(status, opened, key);
-    }
-
-    static Status take(LSTATUS status, SystemKey &opened, RegistryKey &key) {
-        if (status != ERROR_SUCCESS) return static_cast<Status>(status);
-        auto impl = std::make_unique<Impl>();
-        impl->key = std::move(opened);
-        key.impl_ = std::move(impl);
-        return status::ok;
-    }
-};
+Status RegistryKey::Impl::take(LSTATUS status, SystemKey &opened, RegistryKey &key) {
+    if (status != ERROR_SUCCESS) return static_cast<Status>(status);
+    auto impl = std::make_unique<Impl>();
+    impl->key = std::move(opened);
+    key.impl_ = std::move(impl);
+    return vxcomn::status::ok;
+}
 
 RegistryKey::RegistryKey() noexcept = default;
 RegistryKey::RegistryKey(RegistryKey &&) noexcept = default;
@@ -95,16 +86,18 @@ Status RegistryKey::open(RegistryRoot root, WideView path, RegistryAccess access
     return Impl::open(rootKey(root), path, access, key);
 }
 
-Status RegistryKey::create(RegistryRoot root, WideView path, RegistryAccess access, RegistryKey &key, bool *created) {
-    return Impl::create(rootKey(root), path, access, key, created);
+Status RegistryKey::create(RegistryRoot root, WideView path, RegistryAccess access, RegistryKey &key, bool *created,
+                           const SecurityRecord *security) {
+    return Impl::create(rootKey(root), path, access, key, created, security);
 }
 
 Status RegistryKey::openBelow(WideView path, RegistryAccess access, RegistryKey &key) const {
     return impl_ ? Impl::open(impl_->key.get(), path, access, key) : status::invalidHandle;
 }
 
-Status RegistryKey::createBelow(WideView path, RegistryAccess access, RegistryKey &key, bool *created) const {
-    return impl_ ? Impl::create(impl_->key.get(), path, access, key, created) : status::invalidHandle;
+Status RegistryKey::createBelow(WideView path, RegistryAccess access, RegistryKey &key, bool *created,
+                                const SecurityRecord *security) const {
+    return impl_ ? Impl::create(impl_->key.get(), path, access, key, created, security) : status::invalidHandle;
 }
 
 RegistryKey::operator bool() const noexcept {

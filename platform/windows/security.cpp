@@ -5,6 +5,7 @@
 
 // clang-format off: sdk.h brings windows.h, which the other leans on
 #include <aclapi.h>
+#include "platform/unique.h"
 #include "platform/windows/sdk.h"
 // clang-format on
 
@@ -28,8 +29,8 @@ struct LocalTraits {
 };
 using LocalMemory = Unique<LocalTraits>;
 
-void explain(const char *format, DWORD error) noexcept {
-    std::printf(format, static_cast<unsigned>(error));
+void explain(const char *call, DWORD error) noexcept {
+    std::printf("%s Error %u\n", call, static_cast<unsigned>(error));
 }
 
 EXPLICIT_ACCESSW grant(PSID sid, DWORD mask) noexcept {
@@ -46,37 +47,38 @@ EXPLICIT_ACCESSW grant(PSID sid, DWORD mask) noexcept {
 // A record that lives as long as the process, for objects must be made with it to the last moment. Empty after a failure.
 class Record {
   public:
-    explicit Record(DWORD worldMask) noexcept {
+    explicit Record(DWORD worldMask) noexcept { build(worldMask); }
+    const SecurityRecord &get() const noexcept { return record_; }
+
+  private:
+    void build(DWORD worldMask) noexcept {
         SID_IDENTIFIER_AUTHORITY worldAuthority = {SECURITY_WORLD_SID_AUTHORITY}, ntAuthority = {SECURITY_NT_AUTHORITY};
         Sid world, administrators;
         if (!AllocateAndInitializeSid(&worldAuthority, 1, SECURITY_WORLD_RID, 0, 0, 0, 0, 0, 0, 0, world.put()) ||
             !AllocateAndInitializeSid(&ntAuthority, 2, SECURITY_BUILTIN_DOMAIN_RID, DOMAIN_ALIAS_RID_ADMINS, 0, 0, 0, 0, 0, 0,
                                       administrators.put())) {
-            return explain("AllocateAndInitializeSid Error %u\n", GetLastError());
+            return explain("AllocateAndInitializeSid", GetLastError());
         }
         EXPLICIT_ACCESSW entries[] = {grant(world.get(), worldMask), grant(administrators.get(), kKeyEverything)};
-        // Well-known groups are told apart from others in the first entry.
         entries[0].Trustee.TrusteeType = TRUSTEE_IS_WELL_KNOWN_GROUP;
         PACL made = nullptr;
         if (const DWORD error = SetEntriesInAclW(2, entries, nullptr, &made); error != ERROR_SUCCESS) {
-            return explain("SetEntriesInAcl Error %u\n", error);
+            return explain("SetEntriesInAcl", error);
         }
         LocalMemory list(made);
         LocalMemory descriptor(LocalAlloc(LPTR, SECURITY_DESCRIPTOR_MIN_LENGTH));
-        if (!descriptor) return explain("LocalAlloc Error %u\n", GetLastError());
+        if (!descriptor) return explain("LocalAlloc", GetLastError());
         if (!InitializeSecurityDescriptor(descriptor.get(), SECURITY_DESCRIPTOR_REVISION)) {
-            return explain("InitializeSecurityDescriptor Error %u\n", GetLastError());
+            return explain("InitializeSecurityDescriptor", GetLastError());
         }
         if (!SetSecurityDescriptorDacl(descriptor.get(), TRUE, made, FALSE)) {
-            return explain("SetSecurityDescriptorDacl Error %u\n", GetLastError());
+            return explain("SetSecurityDescriptorDacl", GetLastError());
         }
         list.release();
         attributes_ = {sizeof attributes_, descriptor.release(), FALSE};
         record_ = SecurityRecord(&attributes_);
     }
-    const SecurityRecord &get() const noexcept { return record_; }
 
-  private:
     SECURITY_ATTRIBUTES attributes_ = {};
     SecurityRecord record_{nullptr};
 };
