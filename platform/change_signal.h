@@ -2,8 +2,8 @@
 //
 // Tells that something changed at or below a registry key, whichever process changed it. Armed once it is signalled once, for any
 // number of changes, and then has to be armed again. It is a hint to read, never the data: arm first, then read, then wait, and no
-// change is missed. Now and then it may be signalled although nothing changed. Waited for like an event (event.h). Control threads;
-// one thread at a time arms and waits.
+// change is missed. Now and then it may be signalled although nothing changed, and when its key is deleted. Waited for like an
+// event (event.h). Control threads; one thread at a time arms and waits.
 #pragma once
 
 #include <cstdint>

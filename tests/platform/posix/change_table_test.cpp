@@ -96,6 +96,16 @@ TEST_CASE_FIXTURE(test::RegistryFixture, "a writer that is slow between commit a
     CHECK(waitForOne(signal, kLong) == WaitOutcome::signalled);
 }
 
+TEST_CASE_FIXTURE(test::RegistryFixture, "who watches a key that is deleted is signalled, whatever it watches for") {
+    RegistryKey below;
+    ChangeSignal signal;
+    REQUIRE(key.createBelow(VX_TEXT("a\\b"), RegistryAccess::readWrite, below) == status::ok);
+    REQUIRE(ChangeSignal::open(below, ChangeFilter::values, signal) == status::ok);
+    CHECK(signal.arm() == status::ok);
+    CHECK(key.deleteTreeBelow(VX_TEXT("a")) == status::ok);
+    CHECK(waitForOne(signal, kLong) == WaitOutcome::signalled);
+}
+
 TEST_CASE_FIXTURE(test::RegistryFixture, "where the kernel cannot wait for several words at once, waits work all the same") {
     test::Process process = test::startHelper("wait-without-vectors", {toUtf8(path)});
     CHECK(process.wait() == 0);
