@@ -14,17 +14,22 @@ namespace {
 class SignalObject final : public WaitObject {
   public:
     SignalObject(ChangeTable &table, int64_t store, int64_t key, ChangeFilter filter) noexcept
-        : table_(table), slot_(table.slot(key, filter == ChangeFilter::keysAndValues)), store_(store), key_(key) {}
+        : table_(table),
+          slot_(table.slot(key, filter == ChangeFilter::keysAndValues ? ChangeKind::keys : ChangeKind::values)),
+          gone_(table.slot(key, ChangeKind::gone)),
+          store_(store),
+          key_(key) {}
 
     Status arm() noexcept {
         armed_ = false;
-        const uint32_t seen = slot_.generation.load();
-        const Status status = runInStore(false, [this](StoreConnection &store) {
-            const bool there = store.identity() == store_ && store(Query::keyExists).bind(1, key_).next();
-            return there ? status::ok : status::keyDeleted;
-        });
-        if (status != status::ok) return status;
-        seen_ = seen;
+        // The store is asked whether the key is there only if one like it may have gone since it was asked last.
+        const uint32_t gone = gone_.generation.load();
+        if (!asked_ || gone != goneSeen_) {
+            if (const Status status = askForKey(); status != status::ok) return status;
+            asked_ = true;
+            goneSeen_ = gone;
+        }
+        seen_ = slot_.generation.load();
         armed_ = true;
         return status::ok;
     }
@@ -43,10 +48,18 @@ class SignalObject final : public WaitObject {
     void lookAfter() noexcept override { table_.finishForTheDead(); }
 
   private:
+    Status askForKey() const noexcept {
+        return runInStore(false, [this](StoreConnection &store) {
+            const bool there = store.identity() == store_ && store(Query::keyExists).bind(1, key_).next();
+            return there ? status::ok : status::keyDeleted;
+        });
+    }
+
     ChangeTable &table_;
-    ChangeTable::Slot &slot_;
+    ChangeTable::Slot &slot_, &gone_;
     const int64_t store_, key_;
-    uint32_t seen_ = 0;
+    uint32_t seen_ = 0, goneSeen_ = 0;
+    bool asked_ = false;
     bool armed_ = false;
 };
 

@@ -70,14 +70,15 @@ ChangeTable *ChangeTable::get(Status &why) noexcept {
     return made;
 }
 
-ChangeTable::Slot &ChangeTable::slot(int64_t key, bool keysToo) noexcept {
-    return page_->slots[(static_cast<uint64_t>(key) * 2 + (keysToo ? 1 : 0)) % kSlots];
+ChangeTable::Slot &ChangeTable::slot(int64_t key, ChangeKind kind) noexcept {
+    return page_->slots[(static_cast<uint64_t>(key) * 4 + static_cast<uint64_t>(kind)) % kSlots];
 }
 
 void ChangeTable::publish(std::span<const int64_t> keys, ChangeKind kind) noexcept {
     for (const int64_t key : keys) {
-        if (kind == ChangeKind::values) signal(slot(key, false));
-        signal(slot(key, true));
+        if (kind == ChangeKind::gone) signal(slot(key, ChangeKind::gone));
+        if (kind != ChangeKind::keys) signal(slot(key, ChangeKind::values));
+        signal(slot(key, ChangeKind::keys));
     }
 }
 

@@ -21,8 +21,9 @@
 
 namespace vxcomn {
 
-// `values` signals those who watch values and those who watch both, `keys` only the latter.
-enum class ChangeKind : uint8_t { values, keys };
+// What happened, and the slot of each key for those who wait for that. `values` also signals who watches keys and values, who waits
+// in the slot of `keys`; `gone` (the key itself is deleted) signals all.
+enum class ChangeKind : uint8_t { values, keys, gone };
 
 class ChangeTable {
   public:
@@ -34,7 +35,7 @@ class ChangeTable {
     // The process's one, which stays for its life; null, with the reason in `why`, as long as the file cannot be had.
     static ChangeTable *get(Status &why) noexcept;
 
-    Slot &slot(int64_t key, bool keysToo) noexcept;
+    Slot &slot(int64_t key, ChangeKind kind) noexcept;
     // Signals the watchers of all these keys.
     void publish(std::span<const int64_t> keys, ChangeKind kind) noexcept;
     void publishEverything() noexcept;
@@ -49,7 +50,7 @@ class ChangeTable {
     void forgetMark() noexcept;
 
   private:
-    static constexpr size_t kSlots = 16384, kMarks = 1024;
+    static constexpr size_t kSlots = 32768, kMarks = 1024;
     struct Page {
         std::atomic<uint32_t> marks[kMarks];  // 0, or the number of the process that is inside a write
         Slot slots[kSlots];

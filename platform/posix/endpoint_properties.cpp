@@ -18,7 +18,7 @@ HRESULT becomeText(WideView text, PROPVARIANT &value) noexcept {
 HRESULT becomeBlob(const std::vector<uint8_t> &bytes, PROPVARIANT &value) noexcept {
     value.blob.pBlobData = static_cast<BYTE *>(CoTaskMemAlloc(bytes.size()));
     if (value.blob.pBlobData == nullptr) return E_OUTOFMEMORY;
-    std::memcpy(value.blob.pBlobData, bytes.data(), bytes.size());
+    if (!bytes.empty()) std::memcpy(value.blob.pBlobData, bytes.data(), bytes.size());
     value.blob.cbSize = static_cast<ULONG>(bytes.size());
     value.vt = VT_BLOB;
     return S_OK;

@@ -91,12 +91,13 @@ void deleteTree(StoreConnection &store, StoreTransaction &transaction, const Key
         Statement list = store(Query::listTree);
         for (list.bind(1, key); list.next();) gone.push_back(list.number(0));
     }
+    if (keep) std::erase(gone, key);
     store(Query::deleteValuesOfTree).bind(1, key).run();
     store(Query::deleteKeysOfTree).bind(1, key).bind(2, keep ? key : int64_t{0}).run();
     transaction.commit();
     // Who watches a key that is gone learns it, whatever it watches for; above it a key is missing now, and in one that was kept
     // the values are.
-    store.noteChange(gone, ChangeKind::values);
+    store.noteChange(gone, ChangeKind::gone);
     store.noteChange(chain, keep ? ChangeKind::values : ChangeKind::keys);
 }
 
