@@ -1,9 +1,9 @@
 // SPDX-License-Identifier: MIT
 //
 // The machine: one folder that stands for what is machine-wide on Windows. It is the one that VXCOMN_ROOT names, else
-// /var/lib/vxcomn where that can be written, else $XDG_STATE_HOME/vxcomn or ~/.local/state/vxcomn. It holds `registry.db` and
-// `drive_c`. The first use in a process chooses it, and makes it where it is missing; it stays for the life of the process. Control
-// threads.
+// /var/lib/vxcomn where that can be written, else $XDG_STATE_HOME/vxcomn or ~/.local/state/vxcomn. It holds `registry.db`,
+// `signals`, `tokens` and `drive_c`. The first use in a process chooses it, and makes it where it is missing; it stays for the life
+// of the process. Control threads.
 #pragma once
 
 #include <optional>
