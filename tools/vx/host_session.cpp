@@ -14,6 +14,7 @@ namespace vx {
 namespace {
 
 constexpr int32_t kComponentEnable = -6;
+constexpr size_t kMostOutput = 36;  // of a command of the host's own
 
 const char *textOrNull(const std::optional<std::string> &text) {
     return text ? text->c_str() : nullptr;
@@ -98,6 +99,14 @@ ParameterAnswer HostSession::send(const ParameterWrite &write) {
     answer.result = VXDSPAPI_SetParameter(handle_, write.componentId, write.paramId, write.channel, data.data(),
                                           static_cast<uint32_t>(data.size()));
     return answer;
+}
+
+std::vector<uint8_t> HostSession::command(int32_t id, const std::vector<uint8_t> &input) {
+    std::vector<uint8_t> output(kMostOutput);
+    const uint32_t written =
+        VXDSPAPI_ReadWriteData(handle_, 0, id, input.data(), static_cast<int32_t>(input.size()), output.data());
+    output.resize(std::min<size_t>(written, kMostOutput));
+    return output;
 }
 
 }  // namespace vx

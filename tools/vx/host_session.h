@@ -47,6 +47,12 @@ class HostSession {
         VXDSPAPI_Process(handle_, &buffers, &input, &output);
     }
 
+    // [capture] Takes one block of the capture side.
+    void record(ProcessBuffers &buffers, IOFormat &format) { VXDSPAPI_Record(handle_, &buffers, &format); }
+
+    // Runs a diagnostic command of the host's own; what it wrote.
+    std::vector<uint8_t> command(int32_t id, const std::vector<uint8_t> &input);
+
     // The engine's file as the library loaded it.
     std::string engineFile() const;
 

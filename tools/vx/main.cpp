@@ -10,6 +10,7 @@
 
 #include "tools/vx/system.h"
 #include "tools/vx/verb.h"
+#include "tools/vx_measure/measure_verbs.h"
 #include "tools/vx_preset/preset_verbs.h"
 
 namespace {
@@ -47,6 +48,8 @@ int runVx(int argc, char **argv) {
     vx::addRunVerb(app, exitStatus);
     vx::addLevelsVerb(app, exitStatus);
     vx::addJoinVerb(app, exitStatus);
+    vx::addMeasureVerbs(app, exitStatus);
+    vx::addSignalVerb(app, exitStatus);
     vx::addPresetVerbs(app, exitStatus);
     std::vector<std::string> arguments = vx::commandLine(argc, argv);
     std::reverse(arguments.begin(), arguments.end());  // as the parser takes them

@@ -2,7 +2,6 @@
 #include "tools/vx/run_session.h"
 
 #include <algorithm>
-#include <array>
 #include <chrono>
 #include <cmath>
 #include <memory>
@@ -11,6 +10,7 @@
 #include "tools/vx/interrupt.h"
 #include "tools/vx/layout.h"
 #include "tools/vx/levels_csv.h"
+#include "tools/vx/slot_buffers.h"
 #include "tools/vx/text.h"
 #include "tools/vx/verb.h"
 
@@ -19,39 +19,6 @@ namespace vx {
 namespace {
 
 using Clock = std::chrono::steady_clock;
-
-// The eight buffers of a block.
-class SlotBuffers {
-  public:
-    SlotBuffers() {
-        for (size_t slot = 0; slot < pointers_.size(); ++slot) pointers_[slot] = samples_[slot].data();
-        buffers_.channels = pointers_.data();
-    }
-    SlotBuffers(const SlotBuffers &) = delete;
-    SlotBuffers &operator=(const SlotBuffers &) = delete;
-
-    ProcessBuffers &record() { return buffers_; }
-
-    void scatter(const float *interleaved, const IOFormat &format, size_t frames) {
-        const auto channels = static_cast<size_t>(format.channels);
-        for (auto &slot : samples_) slot.fill(0.0F);
-        for (size_t channel = 0; channel < channels; ++channel)
-            for (size_t frame = 0; frame < frames; ++frame)
-                samples_[format.channelSlot[channel]][frame] = interleaved[frame * channels + channel];
-    }
-
-    void gather(float *interleaved, const IOFormat &format, size_t frames) const {
-        const auto channels = static_cast<size_t>(format.channels);
-        for (size_t channel = 0; channel < channels; ++channel)
-            for (size_t frame = 0; frame < frames; ++frame)
-                interleaved[frame * channels + channel] = samples_[format.channelSlot[channel]][frame];
-    }
-
-  private:
-    alignas(64) std::array<std::array<float, VX_MAX_FRAMES>, VX_SLOT_COUNT> samples_ = {};
-    std::array<float *, VX_SLOT_COUNT> pointers_ = {};
-    ProcessBuffers buffers_ = {};
-};
 
 uint32_t fileMaskOf(const RunOptions &options, const AudioFormat &format) {
     const std::string channels = std::to_string(format.channels) + " channels";
