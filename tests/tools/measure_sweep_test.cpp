@@ -53,11 +53,18 @@ TEST_CASE_FIXTURE(MeasureFixture, "a chain of known harmonics gives the known di
 }
 
 TEST_CASE_FIXTURE(MeasureFixture, "a chain without distortion is below the floor in every band, and the band says so") {
-    for (const char *time : {"5000", "20000"}) {
+    const std::vector<std::vector<std::string>> sweeps = {{"--time", "5000"},
+                                                          {"--time", "20000"},
+                                                          {"--bands", "48", "--start", "200", "--time", "4000"},
+                                                          {"--bands", "1", "--time", "4000"},
+                                                          {"--bands", "12", "--lead-in", "120"}};
+    for (const std::vector<std::string> &sweep : sweeps) {
         for (const char *plant : {"delay=0ms", "delay=4ms", "delay=10ms", "delay=300ms,gain=-30dB"}) {
-            CAPTURE(time);
+            CAPTURE(sweep[1]);
             CAPTURE(plant);
-            const json result = measure({"sweep", "--plant", plant, "--time", time}, 1);
+            std::vector<std::string> arguments = {"sweep", "--plant", plant};
+            arguments.insert(arguments.end(), sweep.begin(), sweep.end());
+            const json result = measure(arguments, 1);
             CHECK(result["onset"] == true);
             CHECK(measuredBands(result) == 0);
             CHECK(has(test::MeasureFixture::bandAt(result, 1000.0)["why"].get<std::string>(), "below the floor of this sweep"));
@@ -66,12 +73,15 @@ TEST_CASE_FIXTURE(MeasureFixture, "a chain without distortion is below the floor
     }
 }
 
-TEST_CASE("the floor falls as a sweep grows longer and is larger at low frequencies") {
+TEST_CASE("the floor falls as a sweep grows longer, and is larger at low frequencies and in the first band") {
     vx::SweepSettings settings;
-    const double usual = vx::sweepFloor(settings, 1000.0);
-    CHECK(vx::sweepFloor(settings, 30.0) > 5.0 * usual);
+    constexpr int kBand = 20;  // at 1 kHz
+    const double usual = vx::sweepFloor(settings, kBand, 48000);
+    CHECK(usual < 0.004);
+    CHECK(vx::sweepFloor(settings, 5, 48000) > 2.0 * usual);
+    CHECK(vx::sweepFloor(settings, 3, 48000) > 2.0 * vx::sweepFloor(settings, 4, 48000));
     settings.timeMs *= 2;
-    CHECK(vx::sweepFloor(settings, 1000.0) == doctest::Approx(usual / 2.0));
+    CHECK(vx::sweepFloor(settings, kBand, 48000) == doctest::Approx(usual / 2.0).epsilon(0.01));
 }
 
 TEST_CASE_FIXTURE(MeasureFixture,

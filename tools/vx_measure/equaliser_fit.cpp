@@ -16,10 +16,12 @@ namespace {
 
 constexpr double kSliderHz[kFitBands] = {31, 62, 125, 250, 500, 1000, 2000, 4000, 8000, 1600};
 constexpr double kSliderQuality = 1.44;
+constexpr double kGreedyQuality = 3.0;
 constexpr double kClosest = 1.0 / 12.0;  // octaves between points
 constexpr double kLowestQuality = 0.3;
 constexpr double kHighestQuality = 8.0;
-constexpr double kRidge = 1e-4;  // of two ways to the same curve, the one of smaller gains
+constexpr double kRidge = 0.02;  // of two ways to nearly the same curve, the one of smaller gains
+constexpr double kBeyond = 1.1;
 constexpr int kRounds = 200;
 
 using Vector = std::vector<double>;
@@ -47,7 +49,12 @@ void hold(const Problem &problem, Vector &unknowns) {
     const FitSettings &settings = problem.settings;
     for (size_t i = 0; i < kFitBands; ++i) {
         unknowns[1 + i] = std::clamp(unknowns[1 + i], -kFitMostDb, kFitMostDb);
-        if (!settings.free) continue;
+        if (!settings.free) {
+            // A slider beyond the points would only bend their ends, and do what nobody measured beyond them.
+            const double hz = problem.start[i].hz;
+            if (hz < problem.points.front().hz / kBeyond || hz > problem.points.back().hz * kBeyond) unknowns[1 + i] = 0.0;
+            continue;
+        }
         double &hz = unknowns[1 + kFitBands + i];
         hz = std::clamp(hz, std::log(settings.lowestHz), std::log(std::min(settings.highestHz, 0.45 * settings.sampleRate)));
         double &quality = unknowns[1 + 2 * kFitBands + i];
@@ -145,13 +152,47 @@ Deviation deviationOf(const Curve &curve, const Curve &target) {
     return deviation;
 }
 
-// Where free bands begin: evenly over the range, an octave and a bit wide.
-PeakBands spreadBands(const FitSettings &settings) {
+// Where free bands may begin: evenly over the range, or each where the most remains. Both are tried, as either may lead astray.
+PeakBands spreadBands(const Problem &problem, double mean) {
     PeakBands bands;
+    const FitSettings &settings = problem.settings;
     const double octaves = std::log2(settings.highestHz / settings.lowestHz);
-    for (size_t i = 0; i < kFitBands; ++i)
-        bands[i] = {settings.lowestHz * std::exp2(octaves * (static_cast<double>(i) + 0.5) / kFitBands), kSliderQuality, 0.0};
+    for (size_t i = 0; i < kFitBands; ++i) {
+        const double hz = settings.lowestHz * std::exp2(octaves * (static_cast<double>(i) + 0.5) / kFitBands);
+        bands[i] = {hz, kSliderQuality, std::clamp(mean - levelAt(problem.points, hz), -kFitMostDb, kFitMostDb) / 2.0};
+    }
     return bands;
+}
+
+PeakBands greedyBands(const Problem &problem, double mean) {
+    PeakBands bands;
+    for (PeakBand &band : bands) band = {1000.0, kGreedyQuality, 0.0};
+    for (PeakBand &band : bands) {
+        CurvePoint worst = {problem.points.front().hz, 0.0};
+        for (const CurvePoint &point : problem.points) {
+            const double remains = point.decibels - mean + equaliserResponse(bands, point.hz, problem.settings.sampleRate);
+            if (std::fabs(remains) > std::fabs(worst.decibels)) worst = {point.hz, remains};
+        }
+        band = {std::min(worst.hz, 0.45 * problem.settings.sampleRate), kGreedyQuality,
+                std::clamp(-worst.decibels, -kFitMostDb, kFitMostDb)};
+    }
+    return bands;
+}
+
+// The best unknowns that are found from these bands on.
+Vector optimise(const Problem &problem, const PeakBands &start, double mean) {
+    Vector unknowns(problem.unknowns());
+    unknowns[0] = mean;
+    for (size_t i = 0; i < kFitBands; ++i) {
+        unknowns[1 + i] = start[i].decibels;
+        if (!problem.settings.free) continue;
+        unknowns[1 + kFitBands + i] = std::log(start[i].hz);
+        unknowns[1 + 2 * kFitBands + i] = std::log(start[i].quality);
+    }
+    double damping = 1e-3;
+    for (int round = 0; round < kRounds && improve(problem, unknowns, damping); ++round) {
+    }
+    return unknowns;
 }
 
 }  // namespace
@@ -183,7 +224,7 @@ EqualiserFit fitEqualiser(const Curve &measured, const Curve &target, const FitS
     fit.measured = pointsWithin(measured, settings);
     if (fit.measured.size() < 3)
         throw Failure(ExitStatus::input, "the measured curve has fewer than three points between --from and --to; widen them");
-    Problem problem = {fit.measured, settings, settings.free ? spreadBands(settings) : sliderBands()};
+    Problem problem = {fit.measured, settings, sliderBands()};
     double mean = 0.0;
     for (CurvePoint &point : problem.points) {
         const double wanted = target.empty() ? 0.0 : levelAt(target, point.hz);
@@ -191,16 +232,10 @@ EqualiserFit fitEqualiser(const Curve &measured, const Curve &target, const FitS
         point.decibels -= wanted;
         mean += point.decibels / static_cast<double>(problem.points.size());
     }
-    Vector unknowns(problem.unknowns());
-    unknowns[0] = mean;
-    if (settings.free)
-        for (size_t i = 0; i < kFitBands; ++i) {
-            unknowns[1 + i] = std::clamp(mean - levelAt(problem.points, problem.start[i].hz), -kFitMostDb, kFitMostDb) / 2.0;
-            unknowns[1 + kFitBands + i] = std::log(problem.start[i].hz);
-            unknowns[1 + 2 * kFitBands + i] = std::log(problem.start[i].quality);
-        }
-    double damping = 1e-3;
-    for (int round = 0; round < kRounds && improve(problem, unknowns, damping); ++round) {
+    Vector unknowns = optimise(problem, settings.free ? spreadBands(problem, mean) : sliderBands(), mean);
+    if (settings.free) {
+        const Vector other = optimise(problem, greedyBands(problem, mean), mean);
+        if (sumOfSquares(residuals(problem, other)) < sumOfSquares(residuals(problem, unknowns))) unknowns = other;
     }
     fit.bands = bandsOf(problem, unknowns);
     fit.levelDb = unknowns[0];

@@ -58,9 +58,10 @@ nlohmann::ordered_json deviationJson(const Deviation &deviation) {
 
 std::string textOf(const EqualiserOptions &options, const EqualiserFit &fit, double headroom) {
     const Style style(options.common.colour, stdout);
-    std::string text = "measured " + options.measured + textf(", %zu points from ", fit.measured.size()) +
-                       frequencyText(fit.measured.front().hz) + " to " + frequencyText(fit.measured.back().hz) + "\ntarget   " +
-                       options.target + textf(", %.2f dB below the measured curve\n\n", fit.levelDb);
+    std::string text =
+        "measured " + options.measured + textf(", %zu points from ", fit.measured.size()) + frequencyText(fit.measured.front().hz) +
+        " to " + frequencyText(fit.measured.back().hz) + "\ntarget   " + options.target +
+        textf("; the measured curve lies %.2f dB %s it\n\n", std::fabs(fit.levelDb), fit.levelDb < 0.0 ? "below" : "above");
     text += style.bold(textf("%-5s  %10s  %8s  %6s", "band", "frequency", "gain", "Q")) + "\n";
     for (size_t i = 0; i < kFitBands; ++i)
         text += textf("%-5zu  %10s  %+5.2f dB  %6.2f\n", i + 1, frequencyText(fit.bands[i].hz).c_str(), fit.bands[i].decibels,
@@ -108,15 +109,15 @@ Result resultOf(const EqualiserOptions &options, const EqualiserFit &fit) {
         }
     }
     const double range = highest - lowest;
-    result.plotCommands =
-        titleCommands("Equaliser of ten bands for " + options.measured, std::string("fit: ") + kDefinition, "as measured") +
-        frequencyAxis(fit.measured.front().hz * 0.9, fit.measured.back().hz * 1.1) +
-        textf("set yrange [%.9g:%.9g]\nset ylabel \"dB\"\nset key bottom center maxrows 1\n", lowest - 0.2 * range,
-              highest + 0.06 * range) +
-        "plot $data using 1:3 with lines lw 1.5 dt 2 lc rgb '#222222' title \"target\", "
-        "$data using 1:2 with lines lw 2 lc rgb '#999999' title \"measured\", "
-        "$data using 1:5 with lines lw 2 lc rgb '#e08e0b' title \"equaliser\", "
-        "$data using 1:4 with lines lw 2.5 lc rgb '#1f6fb4' title \"corrected\"\n";
+    result.plotCommands = titleCommands("Equaliser of ten bands for " + utf8Of(pathOf(options.measured).filename()),
+                                        std::string("fit: ") + kDefinition, "") +
+                          frequencyAxis(fit.measured.front().hz * 0.9, fit.measured.back().hz * 1.1) +
+                          textf("set yrange [%.9g:%.9g]\nset ylabel \"dB\"\nset key bottom center maxrows 1\n",
+                                lowest - 0.2 * range, highest + 0.06 * range) +
+                          "plot $data using 1:3 with lines lw 1.5 dt 2 lc rgb '#222222' title \"target\", "
+                          "$data using 1:2 with lines lw 2 lc rgb '#999999' title \"measured\", "
+                          "$data using 1:5 with lines lw 2 lc rgb '#e08e0b' title \"equaliser\", "
+                          "$data using 1:4 with lines lw 2.5 lc rgb '#1f6fb4' title \"corrected\"\n";
     return result;
 }
 

@@ -55,16 +55,22 @@ std::vector<MeterRow> readMeters(Rig &rig) {
     return rows;
 }
 
+// The library's meters begin at 1e-6: what is no higher cannot be told from nothing.
+bool isSilent(double peak) {
+    return peak <= static_cast<double>(1e-6F);
+}
+
 double decibels(double linear) {
-    return linear > 0.0 ? 20.0 * std::log10(linear) : std::numeric_limits<double>::quiet_NaN();
+    return !isSilent(linear) ? 20.0 * std::log10(linear) : std::numeric_limits<double>::quiet_NaN();
 }
 
 std::string barPlot(const std::string &yLabel, double bottom, double top, size_t rows, const char *column, const char *format) {
     return textf("set yrange [%.9g:%.9g]\nset xrange [-0.7:%.1f]\nset ylabel \"%s\"\nunset key\n", bottom, top,
                  static_cast<double>(rows) - 0.3, yLabel.c_str()) +
-           "set boxwidth 0.6\nset style fill solid 0.8 noborder\n" +
-           textf("plot $data using 0:(%.9g):(0.3):xtic(1) with boxes notitle, ", bottom) +
-           textf("$data using 0:%s:($0-0.3):($0+0.3):(%.9g):%s with boxxyerror lc rgb '#1f6fb4', ", column, bottom, column) +
+           "set style fill solid 0.8 noborder\n" +
+           textf(
+               "set xtics noenhanced\nplot $data using 0:%s:($0-0.3):($0+0.3):(%.9g):%s:xtic(1) with boxxyerror lc rgb '#1f6fb4', ",
+               column, bottom, column) +
            textf("$data using 0:%s:(sprintf('%s',%s)) with labels offset 0,0.7\n", column, format, column);
 }
 
@@ -92,13 +98,13 @@ void runLevels(const MeterOptions &options) {
     double top = 0.0;
     for (const MeterRow &row : rows) {
         const std::string line = textf("%-10s  %12s  %9.6f", row.name.c_str(),
-                                       row.peak > 0.0 ? textf("%.2f", decibels(row.peak)).c_str() : "silent", row.peak);
+                                       !isSilent(row.peak) ? textf("%.2f", decibels(row.peak)).c_str() : "silent", row.peak);
         result.text += (row.peak > 1.0 ? style.warning(line + "  above full scale") : line) + "\n";
         result.json["peaks"].push_back(
             {{"meter", row.name}, {"peak", numberOrNull(row.peak)}, {"peakDb", numberOrNull(decibels(row.peak))}});
         result.table.labels.push_back(row.name);
         result.table.rows.push_back({row.peak, decibels(row.peak)});
-        if (row.peak > 0.0) top = std::max(top, decibels(row.peak));
+        if (!isSilent(row.peak)) top = std::max(top, decibels(row.peak));
     }
     result.text += std::string("\nDefinition: ") + kLevelDefinition + ".\n";
     constexpr double kBottomDb = -90.0;
@@ -176,7 +182,7 @@ void runLoad(const MeterOptions &options, int &exitStatus) {
     result.text += std::string("\nDefinition: ") + kLoadDefinition + ".\n";
     result.plotCommands =
         titleCommands("Load", kLoadDefinition, options.chainText()) +
-        barPlot("percent of real time, median", 0.0, std::max(1.25 * top, 1e-3), result.table.rows.size(), "2", "%.3f %%");
+        barPlot("percent of real time, median", 0.0, std::max(1.25 * top, 1e-3), result.table.rows.size(), "($2)", "%.3f %%");
     if (!measured) exitStatus = static_cast<int>(ExitStatus::found);
     files.deliver(result);
 }

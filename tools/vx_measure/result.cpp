@@ -61,9 +61,19 @@ std::string whenText() {
 }
 
 std::string titleCommands(const std::string &what, const std::string &definition, const std::string &chain) {
-    return "set title \"" + gnuplotText(what) + "\" noenhanced offset 0,1.6\nset label 99 \"" + gnuplotText(definition) + "\\n" +
-           gnuplotText(whenText() + ", chain: " + chain) +
-           "\" at graph 0.5,1.0 offset 0,1.6 center noenhanced font ',9' tc rgb '#555555'\nset tmargin 4.6\n";
+    constexpr size_t kWidest = 95;  // letters of the small font that fit
+    std::string small = gnuplotText(definition);
+    int lines = 2;
+    const size_t cut = small.size() > kWidest ? small.rfind("; ", kWidest) : std::string::npos;
+    if (cut != std::string::npos) {
+        small.replace(cut, 2, ";\\n");
+        ++lines;
+    }
+    small += "\\n" + gnuplotText(whenText() + (chain.empty() ? "" : ", chain: " + chain));
+    return "set title \"" + gnuplotText(what) + textf("\" noenhanced offset 0,%.1f\n", 0.9 * lines - 0.2) + "set label 99 \"" +
+           small +
+           textf("\" at graph 0.5,1.0 offset 0,%.1f center noenhanced font ',9' tc rgb '#555555'\nset tmargin %.1f\n",
+                 0.85 * lines - 0.1, 2.9 + 0.85 * lines);
 }
 
 std::string frequencyAxis(double lowestHz, double highestHz) {

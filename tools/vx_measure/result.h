@@ -39,7 +39,7 @@ nlohmann::ordered_json numberOrNull(double value);
 // "measured 2026-05-04 12:30 UTC"
 std::string whenText();
 
-// A title of two lines: what, and in small letters the definition, when it was measured and on which chain.
+// A title: what, and in small letters the definition, which may break behind a semicolon, when it was measured and on which chain.
 std::string titleCommands(const std::string &what, const std::string &definition, const std::string &chain);
 
 // A logarithmic frequency axis with ticks at 1-2-5.

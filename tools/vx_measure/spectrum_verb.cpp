@@ -128,7 +128,7 @@ Result resultOf(const SpectrumOptions &options, const Rig &rig, const Measured &
     Result result;
     result.text = "signal   " + (options.recorded.empty() ? options.signal.text() : "recorded") + textf(", %d Hz\n", rig.rate()) +
                   "tap      " + options.spectrum.tap + ", " + readouts + "\nchain    " + options.chainText() + "\n\n" +
-                  tableText(measured, Style(options.common.colour, stdout)) + "\n" + definition + ".\n" +
+                  tableText(measured, Style(options.common.colour, stdout)) + "\nDefinition: " + definition + ".\n" +
                   (response ? "Response: the level at the record tap over that at the input tap.\n" : "");
     result.json = {{"measurement", "spectrum"}, {"definition", definition + "; " + readouts}};
     result.json.update({{"signal", options.signal.text()},
@@ -244,7 +244,10 @@ void addSpectrumVerb(CLI::App &measure, int &exitStatus) {
     addChain(*verb, *options);
     addResults(*verb, *options);
     verb->footer("Parts of --plant, separated by commas:\n" + plantParts() +
-                 "\nExit status: 0 measured; 1 nothing could be measured.\n"
+                 "\nDefinition: mean power of readouts without overlap in fractional octaves, Hamming window; 0 dB is a sine at "
+                 "full scale. The\n"
+                 "response is the level at the record tap over that at the input tap; simulated chains of one channel have it.\n"
+                 "Exit status: 0 measured; 1 nothing could be measured.\n"
                  "Examples:\n"
                  "  vx measure spectrum --plant band=80-16000 --csv response.csv --plot response.svg\n"
                  "  vx measure spectrum --input music.wav --layout stereo --tap output --set bass=1 --live --seconds 30");

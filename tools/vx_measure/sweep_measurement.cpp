@@ -17,6 +17,8 @@ namespace {
 
 constexpr double kQuality = 2.0;          // of the library's notch
 constexpr double kLateSeconds = 0.00105;  // the library starts to follow at a whole millisecond, and a sample beside the peak
+constexpr double kLag = 0.12;             // how far it lags behind a moving sine, over the time in which it settles
+constexpr double kMargin = 1.2;           // of the estimate over what clean chains show
 constexpr double kPatience = 2.0;         // seconds beyond the end, for the chain's delay
 constexpr double kPollSeconds = 0.1;
 
@@ -67,12 +69,20 @@ bool SweepOutcome::anyMeasured() const {
     return std::any_of(bands.begin(), bands.end(), [](const SweepBand &band) { return band.why.empty(); });
 }
 
-double sweepFloor(const SweepSettings &settings, double hz) {
-    const Span span = spanOf(makeBandGrid(settings.bandsPerOctave), settings);
-    const double octavesPerSecond = (span.count - 1) * 1000.0 / settings.bandsPerOctave / settings.timeMs;
-    // The notch lets pass 2Q of a small relative deviation; it settles within 2Q / w.
+double sweepFloor(const SweepSettings &settings, int band, int rate) {
+    const BandGrid grid = makeBandGrid(settings.bandsPerOctave);
+    const Span span = spanOf(grid, settings);
+    const double hz = grid.edges[static_cast<size_t>(band)];
+    const double bandSeconds = settings.timeMs / 1000.0 / (span.count - 1);
+    // The frequency rises in a straight line from edge to edge, so most steeply, by its own measure, at the lower one.
+    const double relativeSlope = (std::exp2(1.0 / settings.bandsPerOctave) - 1.0) / bandSeconds;
+    // The notch lets pass 2Q of a small relative deviation, and more towards half the rate, where it narrows.
+    const double highestW = 2.0 * std::numbers::pi * std::min(grid.edges[static_cast<size_t>(band) + 1] / rate, 0.49);
+    const double slope = 2.0 * kQuality * highestW / std::sin(highestW);
     const double settling = 2.0 * kQuality / (2.0 * std::numbers::pi * hz);
-    return 2.0 * kQuality * std::numbers::ln2 * octavesPerSecond * (kLateSeconds + settling);
+    // The first band begins with the notch at rest.
+    const double begin = settling / bandSeconds * std::exp((span.first - band) * bandSeconds / settling);
+    return kMargin * (slope * relativeSlope * (kLateSeconds + kLag * settling) + begin);
 }
 
 void checkSweep(const SweepSettings &settings, int rate) {
@@ -127,7 +137,7 @@ SweepOutcome measureSweep(Rig &rig, const SweepSettings &settings, bool silent) 
         band.centreHz = grid.centres[at];
         band.lowestHz = grid.edges[at];
         band.highestHz = grid.edges[at + 1];
-        band.floor = sweepFloor(settings, band.lowestHz);
+        band.floor = sweepFloor(settings, i, rig.rate());
         band.highestOrder = static_cast<int>(nyquist / band.highestHz);
         if (i < span.first || i >= span.first + span.count)
             band.why = "outside the sweep";

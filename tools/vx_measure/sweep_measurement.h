@@ -50,7 +50,8 @@ void stopSweep(Rig &rig, const SweepSettings &settings);
 // Runs the whole measurement.
 SweepOutcome measureSweep(Rig &rig, const SweepSettings &settings, bool silent);
 
-// The largest ratio that the sweep itself leaves at a frequency: the notch follows up to a millisecond and its own settling late.
-double sweepFloor(const SweepSettings &settings, double hz);
+// The largest ratio that the sweep itself leaves in a band of the table: the notch follows up to a millisecond late, lags, and has
+// to settle at the beginning.
+double sweepFloor(const SweepSettings &settings, int band, int rate);
 
 }  // namespace vx

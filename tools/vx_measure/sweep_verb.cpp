@@ -67,7 +67,7 @@ Result resultOf(const SweepOptions &options, const Rig &rig, const SweepOutcome 
     result.text = textf("sweep    %d Hz to %d Hz in %g s, lead-in %d ms, channel %d, %d Hz\n", sweep.startHz, sweep.stopHz,
                         sweep.timeMs / 1000.0, sweep.preDelayMs, sweep.channel, rig.rate()) +
                   "engine   " + rig.engineFile() + "\nchain    " + options.chainText() + "\n\n" +
-                  tableText(outcome, Style(options.common.colour, stdout)) + "\n" + definition + ".\n" + kDetails;
+                  tableText(outcome, Style(options.common.colour, stdout)) + "\nDefinition: " + definition + ".\n" + kDetails;
     result.json = {{"measurement", "sweep"},       {"definition", definition},
                    {"chain", options.chainText()}, {"sampleRate", rig.rate()},
                    {"channel", sweep.channel},     {"startHz", sweep.startHz},
@@ -180,8 +180,8 @@ void addSweepVerb(CLI::App &measure, int &exitStatus) {
     addEngineAndFormat(*verb, *options);
     addChain(*verb, *options);
     addResults(*verb, *options);
-    verb->footer("Parts of --plant, separated by commas:\n" + plantParts() + "\n" + definitionOf(options->sweep) + " (--bands).\n" +
-                 kDetails +
+    verb->footer("Parts of --plant, separated by commas:\n" + plantParts() + "\nDefinition: " + definitionOf(options->sweep) +
+                 " (--bands).\n" + kDetails +
                  "Exit status: 0 measured; 1 nothing could be measured.\n"
                  "Example: vx measure sweep --plant delay=12ms,h2=-40dB,noise=-70dB --plot distortion.png");
     verb->callback([options, &exitStatus] { runSweep(*options, exitStatus); });
