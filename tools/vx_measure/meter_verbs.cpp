@@ -23,7 +23,7 @@ namespace {
 constexpr const char *kLevelDefinition =
     "peak: largest magnitude of each channel over the whole length, 0 dB = 1.0; record: at most four channels";
 constexpr const char *kLoadDefinition =
-    "time in the block function over the time that its frames last at the output's sample rate, in readings of a quarter of a "
+    "time in the block function over the time that its frames last at the output's sample rate; readings of a quarter of a "
     "second";
 constexpr double kReadingSeconds = 0.26;  // the library reckons anew after a quarter
 

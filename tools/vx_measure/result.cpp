@@ -61,7 +61,8 @@ std::string whenText() {
 }
 
 std::string titleCommands(const std::string &what, const std::string &definition, const std::string &chain) {
-    constexpr size_t kWidest = 95;  // letters of the small font that fit
+    constexpr size_t kWidest = 105;  // letters of the small font that fit
+    constexpr size_t kWidestChain = 65;
     std::string small = gnuplotText(definition);
     int lines = 2;
     const size_t cut = small.size() > kWidest ? small.rfind("; ", kWidest) : std::string::npos;
@@ -69,7 +70,8 @@ std::string titleCommands(const std::string &what, const std::string &definition
         small.replace(cut, 2, ";\\n");
         ++lines;
     }
-    small += "\\n" + gnuplotText(whenText() + (chain.empty() ? "" : ", chain: " + chain));
+    const std::string shortened = chain.size() > kWidestChain ? "..." + chain.substr(chain.size() - kWidestChain) : chain;
+    small += "\\n" + gnuplotText(whenText() + (chain.empty() ? "" : ", chain: " + shortened));
     return "set title \"" + gnuplotText(what) + textf("\" noenhanced offset 0,%.1f\n", 0.9 * lines - 0.2) + "set label 99 \"" +
            small +
            textf("\" at graph 0.5,1.0 offset 0,%.1f center noenhanced font ',9' tc rgb '#555555'\nset tmargin %.1f\n",
