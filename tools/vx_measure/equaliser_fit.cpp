@@ -20,7 +20,7 @@ constexpr double kGreedyQuality = 3.0;
 constexpr double kClosest = 1.0 / 12.0;  // octaves between points
 constexpr double kLowestQuality = 0.3;
 constexpr double kHighestQuality = 8.0;
-constexpr double kRidge = 0.01;  // of two ways to nearly the same curve, the one of smaller gains
+constexpr double kRidge = 0.003;  // of two ways to nearly the same curve, the one of smaller gains
 constexpr double kBeyond = 1.1;
 constexpr int kRounds = 200;
 

@@ -30,7 +30,8 @@ bool isOn(const PeakBand &band) {
 }
 
 std::string filterLine(size_t number, const PeakBand &band) {
-    return textf("Filter %zu: %s PK Fc %.4g Hz Gain %.1f dB Q %.2f", number + 1, isOn(band) ? "ON" : "OFF", band.hz,
+    const std::string hz = band.hz >= 100.0 ? textf("%.0f", band.hz) : textf("%.4g", band.hz);
+    return textf("Filter %zu: %s PK Fc %s Hz Gain %.1f dB Q %.2f", number + 1, isOn(band) ? "ON" : "OFF", hz.c_str(),
                  isOn(band) ? band.decibels : 0.0, band.quality);
 }
 
