@@ -47,6 +47,8 @@ TEST_CASE_FIXTURE(MeasureErrors, "usage errors of vx measure end in 2 and say wh
     fails({"measure", "sweep", "--play", path("p.wav"), "--csv", path("x.csv")}, 2, {"need a result"});
     fails({"measure", "sweep", "--plot", path("x.pdf")}, 2, {".svg or .png"});
     fails({"measure", "sweep", "--set", "bass=9"}, 2, {"--set bass=9"});
+    fails({"measure", "levels", "--layout", "0x3FFFF"}, 2, {"has 18 speakers; the library takes 8"});
+    fails({"measure", "levels", "--layout", "6.1"}, 2, {"layout \"6.1\" is unknown"});
     fails({"measure", "polarity", "--half-length", "64"}, 2, {"--half-length"});
     fails({"measure", "polarity", "--plot", path("x.png")}, 2, {"--plot"});
     fails({"measure", "spectrum", "--fft", "5000"}, 2, {"--fft 5000", "a power of two from 256 to 65536"});

@@ -32,6 +32,14 @@ int rateOf(const MeasureOptions &options, const AudioReader *recorded, const Aud
     return rate == 0 ? kUsualRate : rate;
 }
 
+uint32_t maskOf(const MeasureOptions &options) {
+    const uint32_t mask = parseLayout(options.layout);
+    if (channelCount(mask) > kMostChannels)
+        throw Failure(ExitStatus::usage,
+                      textf("--layout 0x%X has %d speakers; the library takes %d", mask, channelCount(mask), kMostChannels));
+    return mask;
+}
+
 EngineChoice engineOf(const MeasureOptions &options, int rate) {
     EngineChoice choice;
     choice.engine = options.engine;
@@ -48,7 +56,7 @@ Rig::Rig(const MeasureOptions &options, int channel, const std::string &input)
       rate_(rateOf(options, recorded_.get(), input_.get())),
       channel_(channel),
       host_(engineOf(options, rate_)),
-      format_(makeFormat(parseLayout(options.layout), options.block, rate_)) {
+      format_(makeFormat(maskOf(options), options.block, rate_)) {
     const int channels = format_.channels;
     if (channel >= channels)
         throw Failure(ExitStatus::usage, textf("--channel %d: layout ", channel) + options.layout +
