@@ -7,7 +7,6 @@
 
 #include <algorithm>
 #include <cstdio>
-#include <random>
 
 extern "C" {
 #include <libavutil/channel_layout.h>
@@ -17,8 +16,8 @@ extern "C" {
 
 #include "VXDSPAPI.h"
 #include "bench/host/bare.h"
+#include "bench/support/block_fixture.h"
 #include "bench/support/timing.h"
-#include "host/adapters.h"
 #include "host/channel_mixer.h"
 #include "host/kernels.h"
 #include "measure/kernels.h"
@@ -30,42 +29,6 @@ using namespace vxcomn;
 using namespace vxcomn::bench;
 
 namespace {
-
-constexpr int kFrames = 512;
-constexpr uint32_t k71 = 0x63F;
-constexpr uint32_t kStereo = 0x3;
-
-// Eight planes at addresses that share no cache set pattern: a whole number of pages apart they would.
-struct Planes {
-    Planes() {
-        for (int c = 0; c < 8; ++c) plane[c] = storage + c * (kFrames + 48);
-        fill(0x1p-33F);
-    }
-    Planes(const Planes &) = delete;
-    Planes &operator=(const Planes &) = delete;
-    void fill(float scale) {
-        std::mt19937 random(1);
-        for (float &sample : storage) sample = static_cast<float>(static_cast<int32_t>(random())) * scale;
-    }
-    alignas(64) float storage[8 * (kFrames + 48)];
-    float *plane[8];
-};
-
-IOFormat formatOf(uint32_t mask) {
-    IOFormat format{};
-    format.channels = __builtin_popcount(mask);
-    format.frames = kFrames;
-    format.sampleRate = 48000;
-    setChannelMask(&format, mask);
-    return format;
-}
-
-template <class F>
-Work repeat(std::string name, F once) {
-    return {std::move(name), [once](int repeats) {
-                for (int i = 0; i < repeats; ++i) once();
-            }};
-}
 
 // The resampler's planar mixing stage at equal rates, with the same matrix.
 class PackagedMixer {
@@ -91,10 +54,6 @@ class PackagedMixer {
   private:
     SwrContext *swr_ = nullptr;
 };
-
-std::string named(const char *what, InstructionSet set) {
-    return std::string(what) + ", " + instructionSetName(set);
-}
 
 void benchFold(InstructionSet best) {
     static Planes planes;
@@ -168,23 +127,6 @@ void benchFixedPoint(InstructionSet best) {
         printRatio(named("adapter", set), ours, ours / nanosecondsOf(figures, "bare"), "bare loads and stores", 2.0, true);
     }
 }
-
-// A context around an engine that passes through; no module is needed.
-struct Host {
-    Host() : context(new LibraryContext()), handle(&context) {
-        context->initialised = 1;
-        chooseAdapters(*context, nullptr);
-        context->engineProcess = [](VXEngineHandle, ProcessBuffers *, IOFormat *, IOFormat *) {};
-        context->inputFormat = formatOf(kStereo);
-        context->outputFormat = formatOf(k71);
-        context->sampleRate = 48000;
-    }
-    ~Host() { delete context; }
-    Host(const Host &) = delete;
-    Host &operator=(const Host &) = delete;
-    LibraryContext *context;
-    VXHandle handle;
-};
 
 void benchBlock(InstructionSet best) {
     static Planes planes;

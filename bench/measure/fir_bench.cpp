@@ -3,28 +3,29 @@
 // fir_bench: how fast FftFirFilter::process is on blocks of 512 samples, beside overlap-add of the same size made with FFTW in
 // double precision (complex, and real) and beside the plain form of the tests.
 //
-// All contenders take turns within each round, so that a change of clock or load meets all of them; a figure is the median over the
-// rounds, a ratio the median of the rounds' ratios.
+// A filter of each instruction set, the peers and the plain form take turns.
 #include <fftw3.h>
 
 #include <algorithm>
-#include <chrono>
 #include <complex>
 #include <cstdio>
-#include <functional>
 #include <random>
 #include <string>
 #include <vector>
 
+#include "bench/support/block_fixture.h"
+#include "bench/support/timing.h"
 #include "measure/fir_kernels.h"
 #include "tests/measure/plain_fir.h"
 #include "vxcomn/measurement_records.h"
 
+using namespace vxcomn;
+using namespace vxcomn::bench;
+
 namespace {
 
 constexpr int kBlock = 512;
-constexpr int kRounds = 41;
-constexpr double kSliceNanoseconds = 300e3;
+constexpr int kRounds = 101;
 
 using Complex = std::complex<double>;
 
@@ -153,34 +154,6 @@ class RealPeer {
     fftw_plan inverse_;
 };
 
-struct Contender {
-    std::string name;
-    std::function<void(float *)> block;  // out of place from the common input
-    int repeats = 1;
-    std::vector<double> times;  // nanoseconds a block, one a round
-};
-
-double now() {
-    return std::chrono::duration<double, std::nano>(std::chrono::steady_clock::now().time_since_epoch()).count();
-}
-
-double timeOf(Contender &contender, float *out) {
-    const double start = now();
-    for (int i = 0; i < contender.repeats; ++i) contender.block(out);
-    return (now() - start) / contender.repeats;
-}
-
-double median(std::vector<double> values) {
-    std::nth_element(values.begin(), values.begin() + static_cast<std::ptrdiff_t>(values.size() / 2), values.end());
-    return values[values.size() / 2];
-}
-
-double medianRatio(const Contender &a, const Contender &b) {
-    std::vector<double> ratios;
-    for (size_t i = 0; i < a.times.size(); ++i) ratios.push_back(a.times[i] / b.times[i]);
-    return median(ratios);
-}
-
 struct Filter : FftFirFilter {
     Filter() { create(); }
     ~Filter() { dispose(); }
@@ -204,42 +177,45 @@ void measure(int tapCount) {
     plain::Fir plainForm;
     plainForm.load(taps);
 
-    std::vector<Contender> contenders;
-    contenders.push_back({"fftw c2c", [&](float *to) { complexPeer.process(in.data(), to, kBlock); }, 1, {}});
-    contenders.push_back({"fftw r2c", [&](float *to) { realPeer.process(in.data(), to, kBlock); }, 1, {}});
-    contenders.push_back({"plain", [&](float *to) { plainForm.process(in.data(), to, kBlock); }, 1, {}});
-    Filter filters[vxcomn::kInstructionSets];
-    for (int i = 0; i <= static_cast<int>(vxcomn::bestInstructionSet()); ++i) {
-        const auto set = static_cast<vxcomn::InstructionSet>(i);
-        vxcomn::selectFirKernels(set);
-        filters[i].load(taps.data(), 0, 48000);
-        filters[i].load(taps.data(), tapCount, 48000);
+    std::vector<Work> works{repeat("c2c", [&] { complexPeer.process(in.data(), out.data(), kBlock); }),
+                            repeat("r2c", [&] { realPeer.process(in.data(), out.data(), kBlock); }),
+                            repeat("plain", [&] { plainForm.process(in.data(), out.data(), kBlock); })};
+    Filter filters[kInstructionSets];
+    const int best = static_cast<int>(bestInstructionSet());
+    for (int i = 0; i <= best; ++i) {
+        const auto set = static_cast<InstructionSet>(i);
+        // A filter keeps to the kernels that it was loaded with, and to its plan as long as the number of taps stays.
+        selectFirKernels(set);
         FftFirFilter &filter = filters[i];
-        contenders.push_back({vxcomn::instructionSetName(set), [&](float *to) { filter.process(in.data(), to, kBlock); }, 1, {}});
+        filter.load(taps.data(), 0, 48000);
+        filter.load(taps.data(), tapCount, 48000);
+        works.push_back(repeat(instructionSetName(set), [&] { filter.process(in.data(), out.data(), kBlock); }));
     }
+    const auto figures = timeInTurns(works, kRounds);
 
-    for (Contender &contender : contenders) {
-        for (int i = 0; i < 3; ++i) timeOf(contender, out.data());
-        contender.repeats = std::max(1, static_cast<int>(kSliceNanoseconds / timeOf(contender, out.data())));
-    }
-    for (int round = 0; round < kRounds; ++round) {
-        for (Contender &contender : contenders) contender.times.push_back(timeOf(contender, out.data()));
-    }
-    std::printf("%5d taps, transform %d\n", tapCount, size);
-    for (const Contender &contender : contenders) {
-        std::printf("  %-9s %9.2f us", contender.name.c_str(), median(contender.times) / 1000.0);
-        if (&contender >= &contenders[3]) {
-            std::printf("   c2c / this %5.2f   r2c / this %5.2f   plain / this %6.2f", medianRatio(contenders[0], contender),
-                        medianRatio(contenders[1], contender), medianRatio(contenders[2], contender));
+    const double complexTime = nanosecondsOf(figures, "c2c"), realTime = nanosecondsOf(figures, "r2c");
+    std::printf("%d taps, transform %d: FFTW c2c %.1f ns, r2c %.1f ns, plain form %.1f ns\n", tapCount, size, complexTime, realTime,
+                nanosecondsOf(figures, "plain"));
+    for (int i = 0; i <= best; ++i) {
+        const auto set = static_cast<InstructionSet>(i);
+        const double ours = nanosecondsOf(figures, instructionSetName(set));
+        const std::string what = named("filter", set);
+        if (set == InstructionSet::avx512) {
+            printRatio(what, ours, complexTime / ours, "faster than FFTW c2c", tapCount >= 512 ? 1.3 : 1.0, false);
+            printRatio(what, ours, nanosecondsOf(figures, "plain") / ours, "faster than the plain form", 8, false);
+        } else if (set == InstructionSet::sse2) {
+            printRatio(what, ours, ours / complexTime, "FFTW c2c", 1.5, true);
+        } else {
+            printRatio(what, ours, complexTime / ours, "faster than FFTW c2c");
         }
-        std::printf("\n");
+        printRatio(what, ours, realTime / ours, "faster than FFTW r2c");
     }
 }
 
 }  // namespace
 
 int main() {
-    std::printf("FIR filter, block %d; medians of %d paired rounds; %s, g++ %s\n", kBlock, kRounds, fftw_version, __VERSION__);
+    printHeading("FIR filter, blocks of 512 samples");
     for (const int tapCount : {32, 128, 512, 1024, 4096}) measure(tapCount);
     return 0;
 }

@@ -68,4 +68,8 @@ void printRatio(const std::string &what, double nanoseconds, double ratio, const
                 atMost ? "at most " : "at least", aim, reached ? "reached" : "MISSED");
 }
 
+void printRatio(const std::string &what, double nanoseconds, double ratio, const char *against) {
+    std::printf("  %-44s %9.1f ns  %7.2f x %s\n", what.c_str(), nanoseconds, ratio, against);
+}
+
 }  // namespace vxcomn::bench

@@ -39,4 +39,7 @@ void printHeading(const char *title);
 // One line of a table: what was reached, and what was aimed at. `atMost` tells which way is better.
 void printRatio(const std::string &what, double nanoseconds, double ratio, const char *against, double aim, bool atMost);
 
+// The same where nothing was aimed at.
+void printRatio(const std::string &what, double nanoseconds, double ratio, const char *against);
+
 }  // namespace vxcomn::bench
