@@ -5,8 +5,6 @@
 #include <memory>
 #include <stdexcept>
 
-#include "digest.h"
-
 namespace golden {
 namespace {
 
@@ -66,10 +64,66 @@ class Stage {
         digest.add(static_cast<uint32_t>(buffers_.silent));
     }
 
+    float sample(size_t slot, int frame) const { return pointers_[slot][frame]; }
+
   private:
     std::vector<float> samples_;
     std::array<float *, VX_SLOT_COUNT> pointers_{};
     std::vector<SignalSource> sources_;
+    ProcessBuffers buffers_ = {};
+};
+
+// Eight buffers of the capture side, filled from those of the render side.
+class Microphone {
+  public:
+    explicit Microphone(const Scene &scene)
+        : path_(scene.path),
+          format_(formatOf(scene.capture, VX_MAX_FRAMES, scene.sampleRate)),
+          samples_(VX_SLOT_COUNT * kLongestBlock),
+          underWay_(VX_SLOT_COUNT, std::vector<float>(static_cast<size_t>(scene.returnDelay) + 1)) {
+        for (size_t slot = 0; slot < pointers_.size(); ++slot) pointers_[slot] = samples_.data() + slot * kLongestBlock;
+        buffers_.channels = pointers_.data();
+    }
+
+    void record(VXHandle handle, const Stage &stage, int frames) {
+        for (int frame = 0; frame < frames; ++frame) {
+            const size_t next = (place_ + 1) % underWay_[0].size();
+            for (size_t slot = 0; slot < pointers_.size(); ++slot) {
+                underWay_[slot][place_] = heard(stage.sample(slot, frame));
+                pointers_[slot][frame] = underWay_[slot][next];
+            }
+            place_ = next;
+        }
+        format_.frames = frames;
+        VXDSPAPI_Record(handle, &buffers_, &format_);
+    }
+
+    void addTo(Digest &digest, int frames) const {
+        for (const float *samples : pointers_) {
+            for (int frame = 0; frame < frames; ++frame) digest.add(samples[frame]);
+        }
+    }
+
+  private:
+    float heard(float sample) const {
+        switch (path_) {
+            case Return::none:
+            case Return::straight:
+                return sample * 0.5F;
+            case Return::inverted:
+                return sample * -0.5F;
+            case Return::bent:
+                return sample * 0.5F + sample * sample * sample * 0.25F;
+        }
+        return 0.0F;
+    }
+
+    Return path_;
+    IOFormat format_;
+    std::vector<float> samples_;
+    std::array<float *, VX_SLOT_COUNT> pointers_{};
+    std::vector<std::vector<float>> underWay_;  // a ring for each slot
+    size_t place_ = 0;
     ProcessBuffers buffers_ = {};
 };
 
@@ -98,19 +152,26 @@ uint64_t digestOf(const Scene &scene) {
     if (scene.prepare) scene.prepare(handle);
 
     Stage stage(scene.signal);
+    Microphone microphone(scene);
     Cut cut(scene);
     Digest digest;
-    bool halfDone = !scene.half;
+    bool halfDone = false;
     for (int done = 0; done < scene.frames;) {
         if (!halfDone && done >= scene.frames / 2) {
-            scene.half(handle);
+            if (scene.half) scene.half(handle);
+            if (scene.read) scene.read(handle, digest);
             halfDone = true;
         }
         const int frames = cut.next();
         stage.play(handle, input, output, frames);
         stage.addTo(digest, frames);
+        if (scene.path != Return::none) {
+            microphone.record(handle, stage, frames);
+            microphone.addTo(digest, frames);
+        }
         done += frames;
     }
+    if (scene.read) scene.read(handle, digest);
     return digest.value();
 }
 

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: MIT
 //
-// One scene: an engine, formats, settings and a signal, run through VXDSPAPI_Process as a customer of the library would, and what
-// comes out as one digest. Single-threaded.
+// One scene: an engine, formats, settings and a signal, run through VXDSPAPI_Process and, with a way back, VXDSPAPI_Record, as a
+// customer of the library would, and what comes out as one digest. Single-threaded.
 #pragma once
 
 #include <cstdint>
@@ -10,6 +10,7 @@
 #include <vector>
 
 #include "VXDSPAPI.h"
+#include "digest.h"
 #include "signal.h"
 
 namespace golden {
@@ -31,6 +32,16 @@ enum Layout : uint32_t {
 };
 
 using Step = std::function<void(VXHandle)>;
+// Adds what an instance has measured.
+using Reading = std::function<void(VXHandle, Digest &)>;
+
+// The way from what comes out to what VXDSPAPI_Record takes in.
+enum class Return : uint8_t {
+    none,      // nothing is recorded
+    straight,  // half as loud
+    inverted,  // half as loud, upside down
+    bent       // with a third harmonic
+};
 
 struct Scene {
     std::string name;
@@ -48,9 +59,14 @@ struct Scene {
     Step prepare = nullptr;    // ahead of the first block
     Step half = nullptr;       // when half of the frames have passed
     bool unformatted = false;  // leaves VXDSPAPI_SetIOFormat out
+    Reading read = nullptr;    // when half of the frames have passed, and at the end
+    Return path = Return::none;
+    int returnDelay = 0;         // frames
+    uint32_t capture = kStereo;  // speakers of the capture side
 };
 
-// Over the samples of all eight slots and the silent word, block by block. Throws std::runtime_error if the host opens no engine.
+// Over the samples of all eight slots and the silent word, block by block; with a return, over what has been recorded as well.
+// Throws std::runtime_error if the host opens no engine.
 uint64_t digestOf(const Scene &scene);
 
 // All scenes, in the order in which they run: the noise generators' sequences go on from one scene to the next.

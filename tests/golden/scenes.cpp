@@ -1,9 +1,11 @@
 // SPDX-License-Identifier: MIT
 //
-// The list of scenes. A new scene goes to the end of its group; scenes with noise of the host's own go to the end of the list,
-// since its sequence runs on from scene to scene.
+// The list of scenes: here those of the block path, in files beside this one those of the measuring tools and the hybrid chain. A
+// new scene goes to the end of its group; one with noise of the host's own goes behind all others that have some, since its
+// sequence runs on from scene to scene.
 #include <utility>
 
+#include "scene_list.h"
 #include "steps.h"
 
 namespace golden {
@@ -19,27 +21,6 @@ constexpr NamedLayout kLayouts[] = {
     {"3.0", kFront},         {"quad back", kQuadBack},    {"quad side", kQuadSide},
     {"5.0 back", kFiveBack}, {"5.1 back", kSurroundBack}, {"5.1 side", kSurroundSide},
     {"6.1", kSixSpeakers},   {"7.1", kSevenOne},          {"7.1 wide", kSevenOneWide},
-};
-
-// Settings that put every stage of the sample engine to work.
-Step everything() {
-    return all({bass(0.5F), detail(0.4F), voice(0.6F), surround(0.7F), band(2, 125.0F, 1.0F, 4.0F), band(7, 4000.0F, 2.0F, -5.0F),
-                inputGain(1.25F), outputGain(0.9F)});
-}
-
-class List {
-  public:
-    // Adds a scene; the caller changes what is special about it.
-    Scene &add(std::string name) {
-        Scene scene;
-        scene.name = std::move(name);
-        scenes_.push_back(std::move(scene));
-        return scenes_.back();
-    }
-    std::vector<Scene> take() { return std::move(scenes_); }
-
-  private:
-    std::vector<Scene> scenes_;
 };
 
 void addLayouts(List &list) {
@@ -228,6 +209,11 @@ std::vector<Scene> allScenes() {
     addSignals(list);
     addModule(list);
     addHostNoise(list);
+    addGenerators(list);
+    addMeters(list);
+    addAnalysers(list);
+    addCaptures(list);
+    addHybrids(list);
     return list.take();
 }
 

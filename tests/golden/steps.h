@@ -75,6 +75,12 @@ inline Step inputGain(float gain) {
     return [=](VXHandle handle) { VXDSPAPI_SetInputGain(handle, gain); };
 }
 
+// Settings that put every stage of the sample engine to work.
+inline Step everything() {
+    return all({bass(0.5F), detail(0.4F), voice(0.6F), surround(0.7F), band(2, 125.0F, 1.0F, 4.0F), band(7, 4000.0F, 2.0F, -5.0F),
+                inputGain(1.25F), outputGain(0.9F)});
+}
+
 // The host's.
 inline Step componentEnable(int32_t component, bool on) {
     return parameter(component, -6, Bytes().u8(on ? 1 : 0));
@@ -92,16 +98,28 @@ inline Step firEnable(bool on) {
     return parameter(-1, -15, Bytes().u8(on ? 1 : 0));
 }
 // A decaying row of taps, exact in f32.
-inline Step firLoad(int count) {
-    Bytes bytes;
-    bytes.u16(static_cast<uint32_t>(count));
+inline void appendTaps(Bytes &bytes, int count) {
     uint32_t word = 12345;
     for (int tap = 0; tap < count; ++tap) {
         word = word * 1664525U + 1013904223U;
         const float noise = static_cast<float>(static_cast<int32_t>(word) >> 8) * 0x1p-23F;
         bytes.f32(noise * static_cast<float>(count - tap) / static_cast<float>(8 * count));
     }
+}
+inline Step firLoad(int count) {
+    Bytes bytes;
+    bytes.u16(static_cast<uint32_t>(count));
+    appendTaps(bytes, count);
     return parameter(-1, -16, bytes);
+}
+inline Step recordFirEnable(uint32_t channel, bool on) {
+    return parameter(-1, -13, Bytes().u8(on ? 1 : 0).u16(channel));
+}
+inline Step recordFirLoad(uint32_t channel, int count) {
+    Bytes bytes;
+    bytes.u16(static_cast<uint32_t>(count)).u16(channel);
+    appendTaps(bytes, count);
+    return parameter(-1, -14, bytes);
 }
 inline Step disposeComponent(uint32_t component) {
     return [=](VXHandle handle) { VXDSPAPI_DisposeComponent(handle, 0, component); };
