@@ -65,6 +65,7 @@ void OutputFile::fail(int error) const {
 
 void OutputFile::write(const void *bytes, size_t count) {
     errno = 0;
+    if (count == 0) return;  // of no bytes even the address may be missing
     if (std::fwrite(bytes, 1, count, stream_) != count) fail(errno);
 }
 
