@@ -81,7 +81,7 @@ void RandomControl::armCaptures() {
     }
     command(VXDSP_DATA_CAPTURE_ARM, input);
     // The command leaves the rings idle; this is what lets them run.
-    (*static_cast<LibraryContext **>(handle_))->captureRequested = 1;
+    (*static_cast<LibraryContext **>(handle_))->captureRequested.exchange(1);  // keeps the order that the command's store began
 }
 
 void RandomControl::runCommand(int32_t id) {
