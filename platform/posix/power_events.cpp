@@ -19,6 +19,8 @@ constexpr int kRetryMilliseconds = 30000;  // how long after there was no bus to
 }  // namespace
 
 struct PowerEvents::Impl {
+    explicit Impl(PowerListener &aListener) : listener(aListener) {}
+
     PowerListener &listener;
     LoginManager manager{listener};
     bool connected = false;  // by the thread that runs
