@@ -85,6 +85,8 @@ class LinkedFile:
         while at < len(self._addresses) and self._addresses[at][0] == address:
             names.append(self._addresses[at][1])
             at += 1
+        # A PE file has a symbol for each section, too, at the address of the section's first function.
+        names = [name for name in names if not name.startswith(".")] or names
         return next((name for name in names if name.startswith("__imp_")), names[0] if names else "")
 
     def next_symbol(self, address):

@@ -12,7 +12,10 @@ import struct
 import subprocess
 import sys
 
-SYSTEM_DLLS = {"kernel32", "advapi32", "ole32", "oleaut32", "version", "shlwapi", "user32", "msvcrt"}
+SYSTEM_DLLS = {"kernel32", "advapi32", "ole32", "oleaut32", "version", "shlwapi", "shell32", "user32", "msvcrt"}
+
+# The programs are customers of the library.
+OWN_DLLS = {"vxcomn64u"}
 
 RT_VERSION = 16
 RT_MANIFEST = 24
@@ -64,7 +67,7 @@ class Image:
 
 def faults(path):
     for name in imports(path):
-        if name not in SYSTEM_DLLS:
+        if name not in SYSTEM_DLLS | (OWN_DLLS if path.endswith(".exe") else set()):
             yield f"imports {name}.dll, which is no system DLL of the list"
     image = Image(path)
     types = image.resource_types()

@@ -38,6 +38,7 @@ int endedByParser(const CLI::App &app, const CLI::ParseError &error) {
 int runVx(int argc, char **argv) {
     CLI::App app("Runs, measures and inspects audio engines and their presets.", "vx");
     app.require_subcommand(1);
+    app.allow_windows_style_options(false);  // a path may begin with a slash
     app.set_help_flag("-h,--help", "Print this help");
     app.set_version_flag("-V,--version", kVersion, "Print the version");
     app.footer(

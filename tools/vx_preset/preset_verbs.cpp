@@ -172,6 +172,7 @@ CLI::App *addVerb(CLI::App &group, const std::shared_ptr<Options> &options, int 
 }  // namespace
 
 void addPresetVerbs(CLI::App &app, int &exitStatus) {
+    app.allow_windows_style_options(false);  // a path may begin with a slash
     CLI::App *const group = app.add_subcommand("preset", "Presets and packages from readable JSON and back");
     group->require_subcommand(1);
     const auto options = std::make_shared<Options>();
