@@ -29,4 +29,26 @@ ComPtr<Interface> shareCom(Interface *object) noexcept {
     return ComPtr<Interface>(object);
 }
 
+// The same, for holders that are copied: every copy has a reference of its own. Equal by address.
+template <class Interface>
+class ComRef {
+  public:
+    ComRef() noexcept = default;
+    explicit ComRef(Interface *object) noexcept : held_(shareCom(object)) {}
+    ComRef(const ComRef &other) noexcept : held_(shareCom(other.get())) {}
+    ComRef(ComRef &&) noexcept = default;
+    ComRef &operator=(ComRef other) noexcept {
+        held_ = std::move(other.held_);
+        return *this;
+    }
+
+    Interface *get() const noexcept { return held_.get(); }
+    Interface *operator->() const noexcept { return held_.get(); }
+    explicit operator bool() const noexcept { return static_cast<bool>(held_); }
+    friend bool operator==(const ComRef &left, const ComRef &right) noexcept { return left.get() == right.get(); }
+
+  private:
+    ComPtr<Interface> held_;
+};
+
 }  // namespace vxcomn
