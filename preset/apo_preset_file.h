@@ -9,7 +9,7 @@
 //         -> UserProfileName -> EngineConfig -> EngineShortName -> ParamRegKeyName        (chain.cpp)
 //
 // and from there the store is the truth: seeded from the preset (seeding.cpp), overruled by what applications force
-// (forced_selection.cpp), and walked for what is new (configuration_walk.cpp, parameter_walk.cpp).
+// (forced_selection.cpp), and walked for what is new (update_walk.cpp).
 //
 // Control threads, never the block path: a handler may wait for the registry and up to 5 s for the slot's mutex. Locks: the state
 // lock first, then Mutex. The parameter walk, and with it the stamps, the pending changes and the known clients, belongs to one
@@ -18,6 +18,7 @@
 
 #include <array>
 #include <cstdint>
+#include <map>
 #include <memory>
 #include <vector>
 
@@ -30,16 +31,25 @@
 #include "preset/preset_reader.h"
 #include "preset/reactive_property.h"
 #include "preset/store_names.h"
-#include "preset/walk_state.h"
 
 namespace vxcomn {
 
 class CUpdateFromRegistryThread;
 
-// Stops the thread (update_thread.cpp).
-struct UpdateThreadStop {
-    void operator()(CUpdateFromRegistryThread *thread) const noexcept;
+inline constexpr int32_t kLowestComponent = -4, kHighestComponent = 31;
+inline constexpr int32_t kLowestParam = -64, kHighestParam = 256;
+inline constexpr size_t kComponentCount = kHighestComponent - kLowestComponent + 1;  // 36
+inline constexpr size_t kParamCount = kHighestParam - kLowestParam + 1;              // 321
+
+// In a parameter's slot: to be read again.
+inline constexpr uint64_t kStampUnread = uint64_t{1} << 63;
+
+struct GuidLess {
+    bool operator()(const GUID &left, const GUID &right) const noexcept { return std::memcmp(&left, &right, sizeof(GUID)) < 0; }
 };
+
+// For each running client, component and parameter the stamp that was delivered last.
+using KnownClients = std::map<GUID, std::map<int32_t, std::map<int32_t, uint64_t>>, GuidLess>;
 
 // The configuration that UpdateFromRegistry found, and which of it has not been served yet, in this order.
 struct PendingConfiguration {
@@ -108,7 +118,6 @@ struct CAPOPresetFile : CInstanceIDBase, protected vxcomn::PresetOwner {
   private:
     // Ahead of the properties, which hold references to it.
     vxcomn::StateLock StateLock_;
-    vxcomn::WalkState Walk_;
 
   public:
     vxcomn::PendingConfiguration Pending;
@@ -141,8 +150,4 @@ struct CAPOPresetFile : CInstanceIDBase, protected vxcomn::PresetOwner {
     std::array<uint8_t, 4> VersionBytes = {};      // the low byte of each
     vxcomn::PresetHash PresetHash = {};
     Property<bool> EngineLocked{StateLock_};
-
-  private:
-    // Last, so that it is stopped first.
-    std::unique_ptr<vxcomn::CUpdateFromRegistryThread, vxcomn::UpdateThreadStop> UpdateThread_;
 };
