@@ -17,7 +17,9 @@
 #pragma once
 
 #include <array>
+#include <atomic>
 #include <cstdint>
+#include <cstring>
 #include <map>
 #include <memory>
 #include <vector>
@@ -50,6 +52,20 @@ struct GuidLess {
 
 // For each running client, component and parameter the stamp that was delivered last.
 using KnownClients = std::map<GUID, std::map<int32_t, std::map<int32_t, uint64_t>>, GuidLess>;
+
+// What the walks have seen. One thread's at a time.
+struct WalkMemory {
+    uint64_t configurationStamp = 0;  // last WriteTime of the configuration key
+    uint64_t parametersStamp = 0;     // last WriteTime of the parameter key
+    std::array<uint64_t, kComponentCount> componentStamps = {};
+    std::array<std::array<uint64_t, kParamCount>, kComponentCount> parameterStamps = {};  // with kStampUnread
+    KnownClients clients;
+};
+
+// Stops and deletes the polling thread (update_thread.cpp).
+struct UpdateThreadDeleter {
+    void operator()(CUpdateFromRegistryThread *thread) const noexcept;
+};
 
 // The configuration that UpdateFromRegistry found, and which of it has not been served yet, in this order.
 struct PendingConfiguration {
@@ -116,6 +132,13 @@ struct CAPOPresetFile : CInstanceIDBase, protected vxcomn::PresetOwner {
     vxcomn::StateLock &stateLock() { return StateLock_; }
 
   private:
+    vxcomn::PresetHash &presetHash() override { return PresetHash; }
+    const vxcomn::WideString &engineShortName() const override { return EngineShortName.underLock(); }
+    const ::EngineConfig &engineConfig() const override { return EngineConfig.underLock(); }
+    bool engineLocked() const override { return EngineLocked.get(); }
+    void setEngineShortName(const vxcomn::WideString &name) override { EngineShortName.set(name); }
+    void setEngineConfig(const ::EngineConfig &config) override { EngineConfig.set(config); }
+
     // Ahead of the properties, which hold references to it.
     vxcomn::StateLock StateLock_;
 
@@ -150,4 +173,38 @@ struct CAPOPresetFile : CInstanceIDBase, protected vxcomn::PresetOwner {
     std::array<uint8_t, 4> VersionBytes = {};      // the low byte of each
     vxcomn::PresetHash PresetHash = {};
     Property<bool> EngineLocked{StateLock_};
+
+  private:
+    // The rows of the chain, top to bottom (chain_device.cpp, chain.cpp).
+    void DevicePropertyStore_Changing();
+    void DevicePropertyStore_Changed();
+    void ModuleVersion_Changing();
+    void ModuleVersion_Changed();
+    void DeviceIDAndEndpointIndex_Changing();
+    void DeviceIDAndEndpointIndex_Changed();
+    void APOTypeStr_Changing();
+    void APOTypeStr_Changed();
+    void IOConfigName_Changing();
+    void IOConfigName_Changed();
+    void ContentTypeName_Changing();
+    void ContentTypeName_Changed();
+    void UserProfileName_Changing();
+    void UserProfileName_Changed();
+    void EngineConfig_Changing();
+    void EngineConfig_Changed();
+    void EngineShortName_Changing();
+    void EngineShortName_Changed();
+
+    template <auto changing, auto changed, class Link>
+    void link(Link &property);
+    template <auto changing, auto changed, class Link>
+    void unlink(Link &property);
+    void deriveDeviceIdentity();
+    void deriveEndpointIndex();
+    void findPreset();
+
+    vxcomn::WalkMemory Walk_;
+    // Set on any thread; the parameter walk then forgets its stamps before it begins.
+    std::atomic<bool> StampsLapsed_{false};
+    std::unique_ptr<vxcomn::CUpdateFromRegistryThread, vxcomn::UpdateThreadDeleter> UpdateThread_;
 };
