@@ -12,11 +12,13 @@
 #include <atomic>
 #include <cstdint>
 #include <memory>
+#include <mutex>
 #include <optional>
 #include <vector>
 
 #include "control/api_context.h"
 #include "control/user_parameter_table.h"
+#include "platform/change_signal.h"
 #include "platform/event.h"
 #include "platform/module.h"
 #include "preset/apo_preset_file.h"
@@ -31,6 +33,12 @@ enum class ApoType : int32_t { none = 0, efx = 1, mfx = 2, sfx = 3, gfx = 4, lfx
 using VXAPOAPIInitialize = HRESULT (*)(int32_t kind, void **apoHandle, const VXWCHAR *endpointGuidText, const GUID *endpointGuid,
                                        IPropertyStore *properties, int32_t hardwareOnly);
 using VXAPOAPIFree = void (*)(void *apoHandle);
+
+// A signal of changes below an open key.
+struct StoreWatch {
+    RegistryKey root;
+    ChangeSignal signal;
+};
 
 inline constexpr const char *kApoModuleName = "VXAPO64U.dll";
 
@@ -48,7 +56,7 @@ struct VXAPOCOMAPI_EndpointContext final : CAPOPresetFile {
     // moved by then.
     bool chooseSlot(const vxcomn::WideString &name);
 
-    // Keeps a silent stream open, or lets go of it (endpoint_audio.cpp). Under the state lock.
+    // Keeps a silent stream open, or lets go of it (activation.cpp). Under the state lock.
     bool ActivateEndpoint();
     void DeactivateEndpoint();
 
@@ -62,6 +70,7 @@ struct VXAPOCOMAPI_EndpointContext final : CAPOPresetFile {
     const void *ConfigChangeData = nullptr;
     uint32_t ConfigChangeSize = 0;
     std::vector<uint8_t> ConfigChangeCopy;  // what ConfigChangeData points to
+    vxcomn::StoreWatch ConfigWatch;         // of the last wait for a selection
 
     int32_t HardwareOnly = 0;
     int32_t HostsAPO = 0;  // talks to the effect module directly
@@ -83,7 +92,8 @@ struct VXAPOCOMAPI_EndpointContext final : CAPOPresetFile {
         InReceiveParamChange{0}, InReceiveConfigChange{0};
     std::atomic<uint8_t> BypassAllInPreset{0};
 
-    // What the getters reported last.
+    // What the getters reported last, under ReportLock, a leaf.
+    std::mutex ReportLock;
     vxcomn::WideString LastEngineName, LastIOConfig, LastUserProfile, LastContentType;
     vxcomn::WideString EndpointID;
 
