@@ -12,10 +12,12 @@
 #include <atomic>
 #include <cstdint>
 #include <memory>
+#include <mutex>
 #include <vector>
 
 #include "control/api_context.h"
 #include "control/user_parameter_table.h"
+#include "platform/change_signal.h"
 #include "platform/event.h"
 #include "platform/module.h"
 #include "preset/apo_preset_file.h"
@@ -31,6 +33,12 @@ using VXAPOAPIInitialize = HRESULT (*)(int32_t kind, void **apoHandle, const VXW
                                        IPropertyStore *properties, int32_t hardwareOnly);
 using VXAPOAPIFree = void (*)(void *apoHandle);
 
+// A signal of changes below an open key.
+struct StoreWatch {
+    RegistryKey root;
+    ChangeSignal signal;
+};
+
 inline constexpr const char *kApoModuleName = "VXAPO64U.dll";
 
 }  // namespace vxcomn
@@ -43,7 +51,7 @@ struct VXAPOCOMAPI_EndpointContext final : CAPOPresetFile {
     // device; nothing has been changed then.
     bool Initialize(const VXWCHAR *endpointId, bool hardwareOnly, bool hostsAPO);
 
-    // Keeps a silent stream open, or lets go of it (endpoint_audio.cpp). Under the state lock.
+    // Keeps a silent stream open, or lets go of it (activation.cpp). Under the state lock.
     bool ActivateEndpoint();
     void DeactivateEndpoint();
 
@@ -57,6 +65,7 @@ struct VXAPOCOMAPI_EndpointContext final : CAPOPresetFile {
     const void *ConfigChangeData = nullptr;
     uint32_t ConfigChangeSize = 0;
     std::vector<uint8_t> ConfigChangeCopy;  // what ConfigChangeData points to
+    vxcomn::StoreWatch ConfigWatch;         // of the last wait for a selection
 
     int32_t HardwareOnly = 0;
     int32_t HostsAPO = 0;  // talks to the effect module directly
@@ -78,7 +87,8 @@ struct VXAPOCOMAPI_EndpointContext final : CAPOPresetFile {
         InReceiveParamChange{0}, InReceiveConfigChange{0};
     std::atomic<uint8_t> BypassAllInPreset{0};
 
-    // What the getters reported last.
+    // What the getters reported last, under ReportLock, a leaf.
+    std::mutex ReportLock;
     vxcomn::WideString LastEngineName, LastIOConfig, LastUserProfile, LastContentType;
     vxcomn::WideString EndpointID;
 

@@ -13,10 +13,12 @@ namespace {
 template <class Context>
 class HandleSet {
   public:
-    Context *find(const void *handle) {
+    Context *find(const void *handle, void (*enter)(Context &) = nullptr) {
         const std::lock_guard guard(lock_);
         const auto found = contexts_.find(handle);
-        return found != contexts_.end() ? *found : nullptr;
+        if (found == contexts_.end()) return nullptr;
+        if (enter != nullptr) enter(**found);
+        return *found;
     }
     void insert(Context *context) {
         const std::lock_guard guard(lock_);
@@ -50,6 +52,10 @@ VXAPOCOMAPI_APIContext *findApi(const void *handle) noexcept {
 VXAPOCOMAPI_EndpointContext *findEndpoint(const void *handle) noexcept {
     VXAPOCOMAPI_EndpointContext *const endpoint = handle != nullptr ? EndpointHandles.find(handle) : nullptr;
     return endpoint != nullptr && endpoint->HandleSignature == kHandleSignature ? endpoint : nullptr;
+}
+
+VXAPOCOMAPI_EndpointContext *findEndpoint(const void *handle, void (*enter)(VXAPOCOMAPI_EndpointContext &)) noexcept {
+    return handle != nullptr ? EndpointHandles.find(handle, enter) : nullptr;
 }
 
 VXAPOCOMAPI_APIContext *findClient(const void *handle) noexcept {
