@@ -29,6 +29,7 @@
 #include "preset/change_record.h"
 #include "preset/global_mutex.h"
 #include "preset/instance_id.h"
+#include "preset/package_reader.h"
 #include "preset/parameter_store.h"
 #include "preset/preset_reader.h"
 #include "preset/reactive_property.h"
@@ -207,9 +208,22 @@ struct CAPOPresetFile : CInstanceIDBase, protected vxcomn::PresetOwner {
     void link(Link &property);
     template <auto changing, auto changed, class Link>
     void unlink(Link &property);
-    void deriveDeviceIdentity();
-    void deriveEndpointIndex();
+    void deriveDeviceIdentity(IPropertyStore *store);
+    void deriveEndpointIndex(IPropertyStore *store);
     void findPreset();
+    vxcomn::OpenedPreset openPreset(const vxcomn::WideString &path);
+    void savePresetHash(const vxcomn::WideString &keyPath);
+
+    // Sets a property to what the store forces, unless that is nothing or stands already.
+    void adopt(Text &property, const vxcomn::WideString &value, const VXWCHAR *traceName, const VXWCHAR *format);
+    void writeDerivedIOConfig(const vxcomn::WideString &keyPath, vxcomn::WideView name);
+    void restorePresetEngine();
+
+    vxcomn::WideString parameterKeyFor(vxcomn::WideView apoType, vxcomn::WideView ioConfig, vxcomn::WideView contentType) const;
+    bool addKeysOfPackage(const vxcomn::WideString &archive, vxcomn::WideView apoType, std::vector<vxcomn::WideString> &keys);
+    void addKeysOfLooseTree(vxcomn::WideView apoType, std::vector<vxcomn::WideString> &keys);
+
+    bool EngineForced_ = false;  // the engine in force is, or was, an application's choice
 
     vxcomn::WalkMemory Walk_;
     // Set on any thread; the parameter walk then forgets its stamps before it begins.
