@@ -13,7 +13,6 @@ namespace vxcomn {
 namespace {
 
 constexpr auto kMachine = RegistryRoot::localMachine;
-constexpr Status kUnsupportedType = 1630;  // data of an unsupported type
 constexpr int32_t kCleanBuffers = -33;
 constexpr int32_t kNoNumber = INT32_MIN;
 constexpr int kMostReadings = 16;  // of one value, while others write it
@@ -199,7 +198,7 @@ ParameterWalk::Reading ParameterWalk::read(const RegistryKey &component, const W
             continue;
         }
         if (data->value->type != RegistryType::binary) {
-            reading.status = kUnsupportedType;
+            reading.status = status::unsupportedType;
             return reading;
         }
         const std::optional<uint64_t> now = time->value ? parameterStampOf(*time->value) : std::nullopt;

@@ -14,8 +14,6 @@
 
 namespace vxcomn {
 
-inline constexpr size_t kMaxParameterBytes = 65536;
-
 // A component key as the walk has found it.
 struct WalkedComponent {
     int32_t id;
