@@ -13,7 +13,6 @@
 #include <cstdint>
 #include <memory>
 #include <mutex>
-#include <optional>
 #include <vector>
 
 #include "control/api_context.h"
@@ -51,10 +50,6 @@ struct VXAPOCOMAPI_EndpointContext final : CAPOPresetFile {
     // Opens the device and its properties, which derives the preset paths and keys, and subscribes. False if there is no such
     // device; nothing has been changed then.
     bool Initialize(const VXWCHAR *endpointId, bool hardwareOnly, bool hostsAPO);
-
-    // Chooses the slot: the text first, which runs the property graph, then the number. False for a name that is none; the text has
-    // moved by then.
-    bool chooseSlot(const vxcomn::WideString &name);
 
     // Keeps a silent stream open, or lets go of it (activation.cpp). Under the state lock.
     bool ActivateEndpoint();
@@ -107,29 +102,31 @@ struct VXAPOCOMAPI_EndpointContext final : CAPOPresetFile {
     vxcomn::Event AudioEvent{vxcomn::EventReset::automatic};  // given to the audio client
 
   private:
-    // The user parameters that stood in the store when its key came up, by id; -1.0 for what couldn't be read.
-    using UserSettings = std::array<float, 17>;
+    // By id; -1.0 for what couldn't be read.
+    using UserSettings = std::array<float, vxcomn::kUserParameterCount>;
 
-    bool openPropertyStore(IMMDevice &device);
+    void openPropertyStore(IMMDevice &device);
     void storeDefaults();
     void loadApoModule();
     void subscribe();
     void unsubscribe();
 
-    // Subscribers (endpoint_preset.cpp).
+    // Subscribers.
     void takeClientMark();
     void setClientMark();
     void APOType_Changing();
     void APOType_Changed();
-    void initializeApo(vxcomn::ApoType type);
     void PresetFilePath_Changing() {}
     void PresetFilePath_Changed();
     void ParamRegKeyName_Changing() {}
     void ParamRegKeyName_Changed();
-    void keepUserSettings();
-    UserSettings readUserSettings();
-    bool storeFitsPreset(const vxcomn::RegistryKey &key) const;
+    void ParamRegKeyName_ChangedEarly();
 
-    std::optional<UserSettings> KeptSettings_;
-    vxcomn::WideString KeptFor_;  // the parameter key that they stood in
+    void initializeApo(int32_t type);
+    bool storeFitsPreset(const vxcomn::RegistryKey &key) const;
+    bool storeHoldsSetting(const vxcomn::WideString &key, const vxcomn::UserParameter &parameter) const;
+    UserSettings readUserSettings();
+    void keepUserSettings();
+
+    bool ChecksConsistency_ = false;  // ParamRegKeyName has its subscriber
 };
