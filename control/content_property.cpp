@@ -6,7 +6,7 @@ namespace {
 
 constexpr GUID kContentProperties = {0xA1784D91, 0x5E58, 0x49C4, {0xA5, 0xFC, 0xA3, 0x3D, 0xC8, 0xB6, 0x6A, 0x18}};
 
-// Kept: all zero for the slots without a property, which the store then refuses.
+// Kept: all zero for the slots without a property.
 PROPERTYKEY contentKey(int32_t apoType) noexcept {
     switch (static_cast<ApoType>(apoType)) {
         case ApoType::efx:
@@ -22,7 +22,8 @@ PROPERTYKEY contentKey(int32_t apoType) noexcept {
 
 HRESULT setText(IPropertyStore *store, const PROPERTYKEY &key, WideString text) {
     if (store == nullptr) return E_POINTER;
-    PROPVARIANT value = {};  // the text stays ours, so nobody clears it
+    if (key.fmtid == GUID{}) return E_INVALIDARG;  // not every system's store refuses it
+    PROPVARIANT value = {};                        // the text stays ours, so nobody clears it
     value.vt = VT_LPWSTR;
     value.pwszVal = text.data();
     return store->SetValue(key, value);

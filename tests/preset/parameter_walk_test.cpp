@@ -3,6 +3,7 @@
 
 #include <doctest/doctest.h>
 
+#include "platform/guid.h"
 #include "preset/store_value_name.h"
 #include "tests/preset/walk_host.h"
 
@@ -104,7 +105,7 @@ TEST_CASE_FIXTURE(Walk, "parameters 257 and -65 log the range message and are pa
 TEST_CASE_FIXTURE(Walk, "names of every kind below a parameter key stop nothing") {
     const test::SlotClient client(*this);
     const std::string id = utf8(client.InstanceId);
-    for (const std::string &component : {"abc", "007", "+5", " 5", "5 ", "0x5", "99999999999999999999", "-0", "-", "5,5"}) {
+    for (const char *component : {"abc", "007", "+5", " 5", "5 ", "0x5", "99999999999999999999", "-0", "-", "5,5"}) {
         part(component, "Data").setBytes(VX_TEXT("1"), std::vector<uint8_t>{1});
         part(component, "Time").setU64(VX_TEXT("1"), freshStamp());
         stamp(component);
