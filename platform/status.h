@@ -34,6 +34,7 @@ inline constexpr Status notOwner = 288;
 inline constexpr Status badDb = 1009;
 inline constexpr Status keyDeleted = 1018;
 inline constexpr Status keyHasChildren = 1020;
+inline constexpr Status unsupportedType = 1630;
 inline constexpr Status resourceTypeNotFound = 1813;
 }  // namespace status
 

@@ -9,7 +9,7 @@
 //         -> UserProfileName -> EngineConfig -> EngineShortName -> ParamRegKeyName        (chain.cpp)
 //
 // and from there the store is the truth: seeded from the preset (seeding.cpp), overruled by what applications force
-// (forced_selection.cpp), and walked for what is new (update_walk.cpp).
+// (forced_selection.cpp), and walked for what is new (configuration_walk.cpp, parameter_walk.cpp).
 //
 // Control threads, never the block path: a handler may wait for the registry and up to 5 s for the slot's mutex. Locks: the state
 // lock first, then Mutex. The parameter walk, and with it the stamps, the pending changes and the known clients, belongs to one
@@ -61,6 +61,14 @@ struct WalkMemory {
     std::array<uint64_t, kComponentCount> componentStamps = {};
     std::array<std::array<uint64_t, kParamCount>, kComponentCount> parameterStamps = {};  // with kStampUnread
     KnownClients clients;
+
+    // Every parameter counts as new again, those of the clients as well.
+    void forgetParameters() {
+        parametersStamp = 0;
+        componentStamps.fill(0);
+        for (auto &stamps : parameterStamps) stamps.fill(0);
+        for (auto &[client, stamps] : clients) stamps.clear();
+    }
 };
 
 // Stops and deletes the polling thread (update_thread.cpp).

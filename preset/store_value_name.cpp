@@ -27,7 +27,7 @@ StoreValueName parseValueName(WideView name) noexcept {
     parsed.paramId = parseDecimal(name.substr(0, comma));
     if (comma == WideView::npos) return parsed;
     parsed.isPrivate = true;
-    parseGuidText(name.substr(comma + 1), parsed.client);
+    if (GUID client; parseGuidText(name.substr(comma + 1), client)) parsed.client = client;
     return parsed;
 }
 

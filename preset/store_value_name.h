@@ -23,7 +23,7 @@ std::optional<int32_t> parseDecimal(WideView text) noexcept;
 struct StoreValueName {
     std::optional<int32_t> paramId;  // nothing if it is no number
     bool isPrivate = false;          // there is a comma
-    GUID client = {};                // zero if what is behind the comma is no GUID
+    std::optional<GUID> client;      // nothing if what is behind the comma is no GUID
 };
 StoreValueName parseValueName(WideView name) noexcept;
 
