@@ -1,0 +1,118 @@
+// SPDX-License-Identifier: MIT
+//
+// What tests of the control functions stand on beside the sample machine: a client, an open endpoint, and the log of both.
+#pragma once
+
+#include <doctest/doctest.h>
+
+#include <algorithm>
+#include <string>
+#include <vector>
+
+#include "VXAPOCOMAPI.h"
+#include "control/api_context.h"
+#include "control/endpoint_context.h"
+#include "tests/support/debug_capture.h"
+#include "tests/support/sample_machine.h"
+
+namespace test {
+
+inline VXAPOCOMAPI_APIContext &apiOf(VXAPOHandle handle) {
+    return *static_cast<VXAPOCOMAPI_APIContext *>(handle);
+}
+inline VXAPOCOMAPI_EndpointContext &endpointOf(VXAPOHandle handle) {
+    return *static_cast<VXAPOCOMAPI_EndpointContext *>(handle);
+}
+
+// One client of the library.
+struct Client {
+    VXAPOHandle api = VXAPOCOMAPI_InitializeAPI();
+
+    Client() { REQUIRE(api != nullptr); }
+    ~Client() { VXAPOCOMAPI_FreeAPI(api); }
+    Client(const Client &) = delete;
+    Client &operator=(const Client &) = delete;
+
+    VXAPOCOMAPI_APIContext &context() const { return apiOf(api); }
+};
+
+// A machine whose endpoint a client has opened; no slot is chosen yet.
+struct OpenEndpoint {
+    vxcomn::testing::SampleMachine machine;
+    Client client;
+    VXAPOHandle endpoint = nullptr;
+
+    OpenEndpoint() {
+        if (!machine.hasEndpoint()) return;
+        endpoint = VXAPOCOMAPI_GetEndpoint(client.api, machine.endpointId().c_str(), 0);
+        REQUIRE(endpoint != nullptr);
+    }
+    bool none() const {
+        if (endpoint == nullptr) MESSAGE("skipped: this machine has no active endpoint for rendering");
+        return endpoint == nullptr;
+    }
+    VXAPOCOMAPI_EndpointContext &context() const { return endpointOf(endpoint); }
+};
+
+// Switches the control functions' logging on, as a user does, and catches what contexts that are made meanwhile say.
+class ControlLog {
+  public:
+    ControlLog() {
+        const vxcomn::WideString path = VX_TEXT("Software\\Ondrevale\\Logging\\APO");
+        REQUIRE(vxcomn::RegistryKey::create(vxcomn::RegistryRoot::localMachine, path, vxcomn::RegistryAccess::readWrite, key_) ==
+                vxcomn::status::ok);
+        REQUIRE(key_.setU32(VX_TEXT("VXCOMAPI"), 1) == vxcomn::status::ok);
+    }
+    ~ControlLog() { key_.deleteValue(VX_TEXT("VXCOMAPI")); }
+    ControlLog(const ControlLog &) = delete;
+    ControlLog &operator=(const ControlLog &) = delete;
+
+    // All texts since the last call of `restart`, without tag, numbers and indentation.
+    std::vector<std::string> texts() const {
+        std::vector<std::string> all = allTexts();
+        all.erase(all.begin(), all.begin() + static_cast<ptrdiff_t>(std::min(from_, all.size())));
+        return all;
+    }
+    void restart() { from_ = allTexts().size(); }
+    std::vector<std::string> lines() const { return capture_.lines(); }
+
+    bool has(const std::string &text) const { return count(text) != 0; }
+    size_t count(const std::string &text) const {
+        const std::vector<std::string> all = texts();
+        return static_cast<size_t>(std::count(all.begin(), all.end(), text));
+    }
+    // Whether the texts stand there in this order, others between them or not.
+    bool hasInOrder(const std::vector<std::string> &wanted) const {
+        size_t at = 0;
+        for (const std::string &text : texts()) {
+            if (at < wanted.size() && text == wanted[at]) ++at;
+        }
+        if (at < wanted.size()) MESSAGE("not in its place: " << wanted[at]);
+        return at == wanted.size();
+    }
+
+  private:
+    std::vector<std::string> allTexts() const {
+        std::vector<std::string> texts;
+        for (const std::string &line : capture_.lines()) {
+            if (line.rfind("VXCOMAPIU[", 0) != 0) continue;
+            const size_t end = line.find("]: ");
+            const size_t text = end == std::string::npos ? end : line.find_first_not_of(' ', end + 3);
+            texts.push_back(text == std::string::npos ? "" : line.substr(text));
+        }
+        return texts;
+    }
+
+    vxcomn::RegistryKey key_;
+    vxcomn::testing::DebugCapture capture_;
+    size_t from_ = 0;
+};
+
+inline std::string hexadecimal(const void *address, bool upperCase = false) {
+    char text[32];
+    std::snprintf(text, sizeof text, upperCase ? "%llX" : "%llx",
+                  static_cast<unsigned long long>(reinterpret_cast<uintptr_t>(address)));
+    return text;
+}
+
+}  // namespace test
