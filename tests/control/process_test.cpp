@@ -138,36 +138,46 @@ TEST_CASE_FIXTURE(OpenEndpoint, "a killed client's setter values stay in the reg
     CHECK(engineOf(endpoint) == "VXORLO");
 }
 
-TEST_CASE_FIXTURE(OpenEndpoint, "a transient parameter is told as such and lapses with the client that is killed") {
+TEST_CASE_FIXTURE(OpenEndpoint, "a transient parameter lapses with the client that is killed, and the shared value is told again") {
     if (none()) return;
     REQUIRE(VXAPOCOMAPI_SetAPOType(endpoint, "EFX") == 1);
+    const uint8_t shared[] = {11};
+    REQUIRE(VXAPOCOMAPI_SetUserParameterEx(endpoint, 0, 77, 0, shared, sizeof shared, 0, 0, nullptr, nullptr) == 1);
     const void *blob = nullptr;
     uint32_t size = 0, count = 0;
     while (VXAPOCOMAPI_ReceiveParamChange(endpoint, &blob, &size, &count, 0, 0) == 1) {
     }
+    // What is told of the one parameter: whether it is transient, and its byte.
+    const auto told = [&]() -> std::pair<int, int> {
+        if (count != 1 || size != 49) return {-1, -1};
+        const auto *record = static_cast<const uint8_t *>(blob);
+        return record[28] == 77 ? std::pair<int, int>(record[40], record[48]) : std::pair<int, int>(-1, -1);
+    };
     OtherClient other(machine);
     REQUIRE(other.ask("transient 0 77") == "1");
     REQUIRE(VXAPOCOMAPI_ReceiveParamChange(endpoint, &blob, &size, &count, 10000, 0) == 1);
-    REQUIRE(count == 1);
-    REQUIRE(size == 49);
-    const auto *record = static_cast<const uint8_t *>(blob);
-    CHECK(record[28] == 77);
-    CHECK(record[40] == 1);
-    CHECK(record[48] == 42);
+    CHECK(told() == std::pair(1, 42));
 
-    const WideString data = SampleMachine::parametersPath() + VX_TEXT("\\0\\Data");
-    RegistryKey key;
-    std::vector<WideString> names;
-    const auto transients = [&] {
-        REQUIRE(RegistryKey::open(RegistryRoot::localMachine, data, RegistryAccess::read, key) == status::ok);
-        names.clear();
+    const auto transients = [] {
+        RegistryKey key;
+        std::vector<WideString> names;
+        REQUIRE(RegistryKey::open(RegistryRoot::localMachine, SampleMachine::parametersPath() + VX_TEXT("\\0\\Data"),
+                                  RegistryAccess::read, key) == status::ok);
         key.values(names);
         return std::count_if(names.begin(), names.end(), [](const WideString &name) { return name.starts_with(VX_TEXT("77,")); });
     };
     CHECK(transients() == 1);
     other.process.kill();
     other.process.wait();
-    VXAPOCOMAPI_ReceiveParamChange(endpoint, &blob, &size, &count, 0, 1);
+    // The next change, of whatever it is, makes the receiver look.
+    REQUIRE(VXAPOCOMAPI_SetUserParameterEx(endpoint, 0, 78, 0, shared, sizeof shared, 0, 0, nullptr, nullptr) == 1);
+    bool again = false;
+    while (VXAPOCOMAPI_ReceiveParamChange(endpoint, &blob, &size, &count, 0, 0) == 1) {
+        const auto *record = static_cast<const uint8_t *>(blob);
+        for (uint32_t i = 0; i < count; ++i, record += 49)
+            again = again || (record[28] == 77 && record[40] == 0 && record[48] == 11);
+    }
+    CHECK(again);
     CHECK(transients() == 0);
 }
 
