@@ -155,7 +155,11 @@ bool CAPOPresetFile::EnsureParametersAreInRegistry() {
     const GlobalMutexLock lock(Mutex);
     logHash(*this, VX_TEXT("Preset file hash = %X%X%X%X%X%X%X%X\n"), PresetHash);
     if (vxcomn::PresetHash stored = {}; GetPresetHash(stored) && stored == PresetHash) return false;
-    ResetParameters(false, false);
+    if (Reseeding.call != nullptr) {
+        Reseeding.call(Reseeding.object);
+    } else {
+        ResetParameters(false, false);
+    }
     return true;
 }
 

@@ -12,7 +12,7 @@
 #include "VXAPOCOMAPI.h"
 #include "control/api_context.h"
 #include "control/endpoint_context.h"
-#include "tests/support/debug_capture.h"
+#include "tests/support/host_log.h"
 #include "tests/support/sample_machine.h"
 
 namespace test {
@@ -54,34 +54,18 @@ struct OpenEndpoint {
     VXAPOCOMAPI_EndpointContext &context() const { return endpointOf(endpoint); }
 };
 
-// Switches the control functions' logging on, as a user does, and catches what contexts that are made meanwhile say.
-class ControlLog {
+// The control functions' log from a place on that the test sets.
+class ControlLog : public vxcomn::testing::ControlLog {
   public:
-    ControlLog() {
-        const vxcomn::WideString path = VX_TEXT("Software\\Ondrevale\\Logging\\APO");
-        REQUIRE(vxcomn::RegistryKey::create(vxcomn::RegistryRoot::localMachine, path, vxcomn::RegistryAccess::readWrite, key_) ==
-                vxcomn::status::ok);
-        REQUIRE(key_.setU32(VX_TEXT("VXCOMAPI"), 1) == vxcomn::status::ok);
-    }
-    ~ControlLog() { key_.deleteValue(VX_TEXT("VXCOMAPI")); }
-    ControlLog(const ControlLog &) = delete;
-    ControlLog &operator=(const ControlLog &) = delete;
+    void restart() { from_ = SwitchedLog::texts().size(); }
 
-    // All texts since the last call of `restart`, without tag, numbers and indentation.
-    std::vector<std::string> texts() const {
-        std::vector<std::string> all = allTexts();
-        all.erase(all.begin(), all.begin() + static_cast<ptrdiff_t>(std::min(from_, all.size())));
-        return all;
-    }
-    void restart() { from_ = allTexts().size(); }
-    std::vector<std::string> lines() const { return capture_.lines(); }
-
+    std::vector<std::string> texts() const { return SwitchedLog::texts(from_); }
     bool has(const std::string &text) const { return count(text) != 0; }
     size_t count(const std::string &text) const {
         const std::vector<std::string> all = texts();
         return static_cast<size_t>(std::count(all.begin(), all.end(), text));
     }
-    // Whether the texts stand there in this order, others between them or not.
+    // Whether these stand in the log one behind the other, with others in between or not. Says which doesn't.
     bool hasInOrder(const std::vector<std::string> &wanted) const {
         size_t at = 0;
         for (const std::string &text : texts()) {
@@ -92,19 +76,6 @@ class ControlLog {
     }
 
   private:
-    std::vector<std::string> allTexts() const {
-        std::vector<std::string> texts;
-        for (const std::string &line : capture_.lines()) {
-            if (line.rfind("VXCOMAPIU[", 0) != 0) continue;
-            const size_t end = line.find("]: ");
-            const size_t text = end == std::string::npos ? end : line.find_first_not_of(' ', end + 3);
-            texts.push_back(text == std::string::npos ? "" : line.substr(text));
-        }
-        return texts;
-    }
-
-    vxcomn::RegistryKey key_;
-    vxcomn::testing::DebugCapture capture_;
     size_t from_ = 0;
 };
 

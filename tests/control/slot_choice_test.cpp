@@ -194,6 +194,7 @@ TEST_CASE("a store filled from another preset keeps each user parameter that cou
         const bool isSwitch = id == 0 || id == 5 || id == 16;
         set[static_cast<size_t>(id)] = isSwitch ? (id == 0 ? 0.0F : 1.0F) : 0.05F * static_cast<float>(id);
         REQUIRE(VXAPOCOMAPI_SetUserParameter(first.endpoint, static_cast<uint32_t>(id), set[static_cast<size_t>(id)]) == 1);
+        set[static_cast<size_t>(id)] = VXAPOCOMAPI_GetUserParameter(first.endpoint, id);
     }
     WriteParameter(nullptr, key, 9, 99, -1, std::vector<uint8_t>{5}, {}, false, nullptr);
     SampleMachine::putPreset(otherPreset());
