@@ -4,6 +4,7 @@
 #include <cstdlib>
 
 #include <dconf.h>
+#include <fcntl.h>
 #include <signal.h>
 #include <sys/wait.h>
 #include <unistd.h>
@@ -38,6 +39,7 @@ MessageBus::MessageBus(const std::filesystem::path &folder) {
     process_ = fork();
     if (process_ == 0) {
         dup2(ends[1], STDOUT_FILENO);
+        dup2(open("/dev/null", O_WRONLY | O_CLOEXEC), STDERR_FILENO);
         close(ends[0]);
         execlp("dbus-daemon", "dbus-daemon", "--session", "--nofork", "--print-address=1", nullptr);
         _exit(127);
@@ -54,9 +56,8 @@ MessageBus::MessageBus(const std::filesystem::path &folder) {
     setenv("DBUS_SESSION_BUS_ADDRESS", address.c_str(), 1);
 }
 
-MessageBus::~MessageBus() {
-    if (process_ <= 0) return;
-    kill(process_, SIGTERM);
+void MessageBus::end() const noexcept {
+    kill(process_, SIGKILL);
     waitpid(process_, nullptr, 0);
 }
 

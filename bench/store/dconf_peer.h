@@ -12,14 +12,12 @@
 
 namespace vxcomn::bench {
 
-// A bus for the scope.
+// A bus, until it is ended.
 class MessageBus {
   public:
     explicit MessageBus(const std::filesystem::path &folder);
-    ~MessageBus();
-    MessageBus(const MessageBus &) = delete;
-    MessageBus &operator=(const MessageBus &) = delete;
     explicit operator bool() const noexcept { return process_ > 0; }
+    void end() const noexcept;
 
   private:
     pid_t process_ = -1;

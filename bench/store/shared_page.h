@@ -22,13 +22,15 @@ struct SharedPage {
     std::atomic<uint32_t> blocked;  // the round that the reader is about to wait in
     std::atomic<uint32_t> arrived;  // the round whose value it had
     std::atomic<int64_t> when;
-
-    static SharedPage *make() {
-        void *page = mmap(nullptr, sizeof(SharedPage), PROT_READ | PROT_WRITE, MAP_SHARED | MAP_ANONYMOUS, -1, 0);
-        require(page != MAP_FAILED, "no shared page");
-        return static_cast<SharedPage *>(page);
-    }
 };
+
+// Something that a fork shares with its parent; all zeros.
+template <class T>
+T *makeShared() {
+    void *page = mmap(nullptr, sizeof(T), PROT_READ | PROT_WRITE, MAP_SHARED | MAP_ANONYMOUS, -1, 0);
+    require(page != MAP_FAILED, "no shared page");
+    return static_cast<T *>(page);
+}
 
 inline int64_t nowNanoseconds() {
     timespec now;
