@@ -92,7 +92,9 @@ void CAPOPresetFile::findPreset() {
     EngineShortName.set({});
 }
 
+// Under the state lock, since the hash and the engine are the object's own.
 bool CAPOPresetFile::LoadPreset(uint32_t flags, PresetParameters *parameters) {
+    const std::lock_guard guard(StateLock_);
     const WideString path = PresetFilePath.get();
     WideString arguments = VX_TEXT("PresetFilePath = ") + path + VX_TEXT(", LoadPresetFlags = 0x");
     appendHexadecimal(arguments, flags);
@@ -108,6 +110,7 @@ bool CAPOPresetFile::LoadPreset(uint32_t flags, PresetParameters *parameters) {
 }
 
 bool CAPOPresetFile::ResetParameters(bool wholeTree, bool keepPower) {
+    const std::lock_guard guard(StateLock_);
     const TraceScope scope(TraceTarget, VX_TEXT("ResetParameters"));
     const GlobalMutexLock lock(Mutex);
     const WideString key = ParamRegKeyName.get();
@@ -148,6 +151,7 @@ bool CAPOPresetFile::ResetParameter(int32_t ComponentId, int32_t ParamId, bool) 
 }
 
 bool CAPOPresetFile::EnsureParametersAreInRegistry() {
+    const std::lock_guard guard(StateLock_);
     const GlobalMutexLock lock(Mutex);
     logHash(*this, VX_TEXT("Preset file hash = %X%X%X%X%X%X%X%X\n"), PresetHash);
     if (vxcomn::PresetHash stored = {}; GetPresetHash(stored) && stored == PresetHash) return false;

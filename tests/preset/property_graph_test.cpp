@@ -312,7 +312,7 @@ TEST_CASE_FIXTURE(Graph, "a property set twice in a row, with a change each time
     host->UserProfileName.set(VX_TEXT("Evening"));
     CHECK(log.count("{ UserProfileName_Changing(UserProfileName = GlobalProfile)") == 1);
     CHECK(log.count("{ UserProfileName_Changed(UserProfileName = Evening)") == 1);
-    CHECK(log.count("{ EngineConfig_Changed(EngineConfig = { 0, 1 })") == 1);
+    CHECK(log.count("{ EngineConfig_Changed(EngineConfig = { 0, 0 })") == 1);
     CHECK(log.count("{ EngineShortName_Changed(EngineShortName = KZNOVA)") == 1);
 }
 

@@ -2,6 +2,7 @@
 //
 // The preset seeds the store, and the store tells which preset did.
 #include <cstring>
+#include <thread>
 
 #include "platform/last_error.h"
 #include "tests/preset/graph_fixture.h"
@@ -293,4 +294,37 @@ TEST_CASE_FIXTURE(Graph, "a package's preset seeds like a loose one") {
     putPackage(Package().add("7/7/EFX/LineOut/AnyContent/Preset.bin", writePreset(seedDocument(4))));
     open();
     CHECK(value(5, 115) == Bytes{4});
+}
+
+TEST_CASE_FIXTURE(Seeded, "threads may select, reset and read one object at the same time") {
+    putPreset(seedDocument(2), "EFX", "Other");
+    host->Enabled = 0;
+    std::vector<std::thread> threads;
+    threads.emplace_back([this] {
+        for (int round = 0; round < 10; ++round) host->IOConfigName.set(round % 2 == 0 ? VX_TEXT("Other") : VX_TEXT("LineOut"));
+    });
+    threads.emplace_back([this] {
+        for (int round = 0; round < 5; ++round) host->ResetParameters(false, round % 2 == 0);
+    });
+    threads.emplace_back([this] {
+        for (int round = 0; round < 10; ++round) {
+            host->ResetParameter(5, 115, false);
+            std::vector<WideString> keys;
+            host->GetAllParamRegKeysForAPOType(VX_TEXT("EFX"), keys);
+            CHECK(keys.size() == 2);
+        }
+    });
+    bool failed = false;
+    threads.emplace_back([this, &failed] {
+        for (int round = 0; round < 20; ++round) {
+            uint8_t data[4] = {};
+            uint32_t size = sizeof data;
+            host->UpdateEngine();
+            failed = failed || !host->GetParameter(-1, -18, -1, data, size, nullptr, nullptr);
+        }
+    });
+    for (std::thread &thread : threads) thread.join();
+    CHECK_FALSE(failed);
+    host->ResetParameters(false, false);
+    CHECK(value(5, 115) == Bytes{1});
 }
