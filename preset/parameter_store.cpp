@@ -134,6 +134,7 @@ bool WriteParameter(const CTraceFuncCallTarget *trace, WideView parameterKey, in
                     std::span<const uint8_t> data, const ParameterSource &source, bool isTransient, uint64_t *stamp) {
     if (parameterKey.empty()) {
         if (trace != nullptr) trace->log(VX_TEXT("Empty param reg key received\n"));
+        setLastError(status::invalidParameter);
         return false;
     }
     const WideString component = decimalName(componentId);
@@ -148,7 +149,7 @@ bool WriteParameter(const CTraceFuncCallTarget *trace, WideView parameterKey, in
         whole = inOneWrite([&] { return writeSteps(parameterKey, component, name, data, guid, written, steps); });
         if (written == 0 && steps.key == status::ok) {
             steps.key = whole;  // it did not come to the first step
-        } else if (steps.component == status::ok && steps.keyStamp == status::ok) {
+        } else if (steps.key == status::ok && steps.component == status::ok && steps.keyStamp == status::ok) {
             if (whole != status::ok) steps.componentStamp = whole;  // each step went well, and yet all together did not
         }
     }
@@ -160,6 +161,7 @@ bool WriteParameter(const CTraceFuncCallTarget *trace, WideView parameterKey, in
     logFailure(trace, steps.time, VX_TEXT("Failed to create 'Time' reg value with error code %i\n"));
     logFailure(trace, steps.componentStamp, VX_TEXT("Failed to create 'WriteTime' reg value with error code %i\n"));
     if (stamp != nullptr && written != 0) *stamp = written;
+    if (whole != status::ok) setLastError(whole);
     return whole == status::ok;
 }
 
