@@ -112,7 +112,6 @@ bool CAPOPresetFile::LoadPreset(uint32_t flags, PresetParameters *parameters) {
 }
 
 bool CAPOPresetFile::ResetParameters(bool wholeTree, bool keepPower) {
-    const std::lock_guard guard(StateLock_);
     const TraceScope scope(TraceTarget, VX_TEXT("ResetParameters"));
     // Properties are read below, and whoever holds the state lock may be waiting for the mutex.
     const std::lock_guard guard(StateLock_);

@@ -16,8 +16,8 @@ namespace {
 
 const std::filesystem::path kSample = std::filesystem::path(VXCOMN_SOURCE_DIR) / "examples" / "sample_machine";
 
-struct SampleMachine : test::EndpointKeys {
-    explicit SampleMachine(const std::string &ssid = {}) {
+struct LaidOutMachine : test::EndpointKeys {
+    explicit LaidOutMachine(const std::string &ssid = {}) {
         std::vector<std::string> arguments = {(kSample / "install.sh").string()};
         if (!ssid.empty()) arguments.push_back(ssid);
         const test::Outcome outcome =
@@ -25,7 +25,7 @@ struct SampleMachine : test::EndpointKeys {
         INFO(outcome.output << outcome.errors);
         REQUIRE(outcome.status == 0);
     }
-    ~SampleMachine() {
+    ~LaidOutMachine() {
         std::filesystem::remove(hostPath(VX_TEXT("C:\\Windows\\System32\\VXAPODATU.HDAUDIO.FUNC_01&VEN_5A17&DEV_0001.zip")));
         Graph::clean();
     }
@@ -65,7 +65,7 @@ constexpr const char *kSpeakers = "{0.0.0.00000000}.{5D9A1C70-3B52-4E0F-9C41-0A6
 }  // namespace
 
 TEST_CASE("the sample machine's script writes what its description says, and nothing else") {
-    const SampleMachine machine;
+    const LaidOutMachine machine;
     const auto description = nlohmann::json::parse(std::ifstream(kSample / "endpoints.json"));
     for (const auto &endpoint : description.at("endpoints")) {
         const auto path = endpoint.at("key").get<std::string>().substr(5);  // behind HKLM\.
@@ -81,7 +81,7 @@ TEST_CASE("the sample machine's script writes what its description says, and not
 }
 
 TEST_CASE("every endpoint of the sample machine has a preset for each of its effect slots") {
-    SampleMachine machine;
+    LaidOutMachine machine;
     const std::pair<const char *, const char *> endpoints[] = {
         {kSpeakers, "0/%/AnyOutput"},
         {"{0.0.0.00000000}.{5D9A1C70-3B52-4E0F-9C41-0A6E27D1B002}", "1/%/Headphones"},
@@ -100,7 +100,7 @@ TEST_CASE("every endpoint of the sample machine has a preset for each of its eff
 }
 
 TEST_CASE("the sample machine's second model has presets of its own") {
-    SampleMachine machine("SUBSYS_5A170002");
+    LaidOutMachine machine("SUBSYS_5A170002");
     const std::unique_ptr<Host> host = machine.open(kSpeakers, "EFX");
     CHECK(toUtf8(host->SSID.get()) == "SUBSYS_5A170002");
     CHECK(toUtf8(host->PresetZipEntry.get()) == "1/0/EFX/AnyOutput/AnyContent/Preset.bin");
