@@ -128,13 +128,13 @@ void makeKeys(const fs::path &root) {
     for (const char *word : {"{", "}.", "\\", "&SUBSYS_", "&"}) corpus.word(word);
 }
 
-void makeNames(const fs::path &root) {
-    Corpus corpus(root, "registry_names_fuzz");
-    for (const char *name : {"-1", "0", "31", "-18", "256", "-64", "2147483647", "-2147483648", "007", "-0", "+1", " 1",
-                             "-18,{01020304-0506-0708-090A-0B0C0D0E0F10}", "5,{}", "5,", ",", "999999999999999,x"})
-        corpus.seed(std::string(name));
-    for (const char *word : {"-", ",", "{", "}", "{01020304-0506-0708-090a-0b0c0d0e0f10}", "2147483648", "-2147483649"})
-        corpus.word(word);
+void makeValueNames(const fs::path &root) {
+    Corpus corpus(root, "store_value_name_fuzz");
+    for (const char *number : {"0", "-18", "256", "-64", "2147483647", "-2147483648", "2147483648"}) {
+        corpus.seed(std::string(number));
+        corpus.seed(std::string(number) + ",{CD147EE7-2140-4445-B39A-473D43BE970D}");
+    }
+    for (const char *word : {"-", ",", "{", "}", "0", "CD147EE7-2140-4445-B39A-473D43BE970D"}) corpus.word(word);
 }
 
 }  // namespace
@@ -149,6 +149,6 @@ int main(int argc, char **argv) {
     makePackages(root);
     makeMaps(root);
     makeKeys(root);
-    makeNames(root);
+    makeValueNames(root);
     return 0;
 }
