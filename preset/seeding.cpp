@@ -94,7 +94,9 @@ void CAPOPresetFile::findPreset() {
     EngineShortName.set({});
 }
 
+// Under the state lock, since the hash and the engine are the object's own.
 bool CAPOPresetFile::LoadPreset(uint32_t flags, PresetParameters *parameters) {
+    const std::lock_guard guard(StateLock_);
     const WideString path = PresetFilePath.get();
     WideString arguments = VX_TEXT("PresetFilePath = ") + path + VX_TEXT(", LoadPresetFlags = 0x");
     appendHexadecimal(arguments, flags);
