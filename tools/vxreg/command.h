@@ -30,7 +30,7 @@ struct Command {
     std::optional<std::string> separator;  // /s TEXT of add
     bool allValues = false;                // /va
     bool recursive = false;                // /s of query
-    bool force = false;                    // /f
+    bool force = false;                    // /f, and /y of export
 };
 
 // `known` names the switches of the verb, each behind a blank: those with an argument end in '='.
@@ -45,6 +45,8 @@ std::string printName(const vxcomn::WideString &name);
 void add(const std::vector<std::string> &arguments);
 void query(const std::vector<std::string> &arguments);
 void remove(const std::vector<std::string> &arguments);
+void exportKeys(std::vector<std::string> arguments);
+void importKeys(const std::vector<std::string> &arguments);
 
 // The usage of a verb, or of the program for an empty name; empty for an unknown one.
 std::string usage(const std::string &verb);

@@ -5,6 +5,7 @@
 #include <cctype>
 #include <exception>
 #include <iostream>
+#include <utility>
 
 #include "tools/common/arguments.h"
 #include "tools/vxreg/command.h"
@@ -36,6 +37,10 @@ void run(std::vector<std::string> arguments) {
         vxreg::add(arguments);
     } else if (verb == "query") {
         vxreg::query(arguments);
+    } else if (verb == "export") {
+        vxreg::exportKeys(std::move(arguments));
+    } else if (verb == "import") {
+        vxreg::importKeys(arguments);
     } else {
         vxreg::remove(arguments);
     }

@@ -10,6 +10,8 @@ std::string usage(const std::string &verb) {
                "  vxreg query    prints values and keys\n"
                "  vxreg add      makes a key, writes a value\n"
                "  vxreg delete   deletes a key or values\n"
+               "  vxreg export   writes a key with all below it into a file\n"
+               "  vxreg import   writes into the registry what such a file holds\n"
                "\n"
                "A key is HKLM, HKCU, HKU or HKCR (or HKEY_LOCAL_MACHINE, HKEY_CURRENT_USER, HKEY_USERS, HKEY_CLASSES_ROOT) and a\n"
                "path below it: HKLM\\Software\\Name. On Linux the registry is in the folder that VXCOMN_ROOT names.\n"
@@ -50,6 +52,24 @@ std::string usage(const std::string &verb) {
                "Without /v, /ve or /va the key itself is deleted, with all below it.\n"
                "\n"
                "Example: vxreg delete HKLM\\Software\\Name /f\n";
+    }
+    if (verb == "export") {
+        return "vxreg export KEY FILE [/y]\n"
+               "\n"
+               "  /y   overwrites the file without asking\n"
+               "\n"
+               "The file is text, as Windows' own tools write it (.reg), in UTF-16.\n"
+               "\n"
+               "Example: vxreg export HKLM\\Software\\Name saved.reg\n";
+    }
+    if (verb == "import") {
+        return "vxreg import FILE\n"
+               "\n"
+               "The file is text as 'vxreg export' writes it, in UTF-16 or UTF-8. If there is a mistake in it nothing is written, "
+               "and the\n"
+               "message names its line.\n"
+               "\n"
+               "Example: vxreg import saved.reg\n";
     }
     return {};
 }

@@ -1,0 +1,25 @@
+// SPDX-License-Identifier: MIT
+//
+// The parts of control_bench, and what they share.
+#pragma once
+
+#include <algorithm>
+#include <stdexcept>
+#include <vector>
+
+namespace vxcomn::bench {
+
+inline void require(bool done, const char *what) {
+    if (!done) throw std::runtime_error(what);
+}
+
+inline double medianOf(std::vector<double> values) {
+    const auto middle = values.begin() + static_cast<std::ptrdiff_t>(values.size() / 2);
+    std::nth_element(values.begin(), middle, values.end());
+    return *middle;
+}
+
+void printOpeningFigures();
+void printEnumerationFigures();
+
+}  // namespace vxcomn::bench
