@@ -10,6 +10,7 @@
 
 #include "tools/vx/system.h"
 #include "tools/vx/verb.h"
+#include "tools/vx_client/client_verbs.h"
 #include "tools/vx_measure/measure_verbs.h"
 #include "tools/vx_preset/preset_verbs.h"
 
@@ -36,7 +37,7 @@ int endedByParser(const CLI::App &app, const CLI::ParseError &error) {
 }
 
 int runVx(int argc, char **argv) {
-    CLI::App app("Runs, measures and inspects audio engines and their presets.", "vx");
+    CLI::App app("Runs, measures and inspects audio engines and their presets, and drives the effects of audio endpoints.", "vx");
     app.require_subcommand(1);
     app.allow_windows_style_options(false);  // a path may begin with a slash
     app.set_help_flag("-h,--help", "Print this help");
@@ -52,6 +53,7 @@ int runVx(int argc, char **argv) {
     vx::addMeasureVerbs(app, exitStatus);
     vx::addSignalVerb(app, exitStatus);
     vx::addPresetVerbs(app, exitStatus);
+    vx::addClientVerbs(app, exitStatus);
     std::vector<std::string> arguments = vx::commandLine(argc, argv);
     std::reverse(arguments.begin(), arguments.end());  // as the parser takes them
     try {
