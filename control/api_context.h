@@ -12,6 +12,7 @@
 #include <atomic>
 #include <cstdint>
 #include <map>
+#include <memory>
 #include <mutex>
 #include <set>
 #include <vector>
@@ -30,6 +31,8 @@ namespace vxcomn {
 inline constexpr uint32_t kHandleSignature = 0x46D3C1DF;
 
 enum class HandleType : int32_t { api = 0, endpoint = 1 };  // TypeID
+
+struct NotificationListener;
 
 // Both kinds of contexts log by the same switch under the same tag.
 void beginControlTrace(DBG_TRACE &trace);
@@ -72,5 +75,6 @@ struct VXAPOCOMAPI_APIContext final : CTraceFuncCallTargetAndTypeID {
     void takeBackSetterValues();
     void Free();
 
+    std::shared_ptr<vxcomn::NotificationListener> Listener_;
     std::mutex SetterValuesLock_;
 };

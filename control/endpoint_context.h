@@ -12,11 +12,12 @@
 #include <atomic>
 #include <cstdint>
 #include <memory>
-#include <optional>
+#include <mutex>
 #include <vector>
 
 #include "control/api_context.h"
 #include "control/user_parameter_table.h"
+#include "platform/change_signal.h"
 #include "platform/event.h"
 #include "platform/module.h"
 #include "preset/apo_preset_file.h"
@@ -32,6 +33,12 @@ using VXAPOAPIInitialize = HRESULT (*)(int32_t kind, void **apoHandle, const VXW
                                        IPropertyStore *properties, int32_t hardwareOnly);
 using VXAPOAPIFree = void (*)(void *apoHandle);
 
+// A signal of changes below an open key.
+struct StoreWatch {
+    RegistryKey root;
+    ChangeSignal signal;
+};
+
 inline constexpr const char *kApoModuleName = "VXAPO64U.dll";
 
 }  // namespace vxcomn
@@ -44,11 +51,7 @@ struct VXAPOCOMAPI_EndpointContext final : CAPOPresetFile {
     // device; nothing has been changed then.
     bool Initialize(const VXWCHAR *endpointId, bool hardwareOnly, bool hostsAPO);
 
-    // Chooses the slot: the text first, which runs the property graph, then the number. False for a name that is none; the text has
-    // moved by then.
-    bool chooseSlot(const vxcomn::WideString &name);
-
-    // Keeps a silent stream open, or lets go of it (endpoint_audio.cpp). Under the state lock.
+    // Keeps a silent stream open, or lets go of it (activation.cpp). Under the state lock.
     bool ActivateEndpoint();
     void DeactivateEndpoint();
 
@@ -62,6 +65,7 @@ struct VXAPOCOMAPI_EndpointContext final : CAPOPresetFile {
     const void *ConfigChangeData = nullptr;
     uint32_t ConfigChangeSize = 0;
     std::vector<uint8_t> ConfigChangeCopy;  // what ConfigChangeData points to
+    vxcomn::StoreWatch ConfigWatch;         // of the last wait for a selection
 
     int32_t HardwareOnly = 0;
     int32_t HostsAPO = 0;  // talks to the effect module directly
@@ -83,7 +87,8 @@ struct VXAPOCOMAPI_EndpointContext final : CAPOPresetFile {
         InReceiveParamChange{0}, InReceiveConfigChange{0};
     std::atomic<uint8_t> BypassAllInPreset{0};
 
-    // What the getters reported last.
+    // What the getters reported last, under ReportLock, a leaf.
+    std::mutex ReportLock;
     vxcomn::WideString LastEngineName, LastIOConfig, LastUserProfile, LastContentType;
     vxcomn::WideString EndpointID;
 
@@ -97,29 +102,31 @@ struct VXAPOCOMAPI_EndpointContext final : CAPOPresetFile {
     vxcomn::Event AudioEvent{vxcomn::EventReset::automatic};  // given to the audio client
 
   private:
-    // The user parameters that stood in the store when its key came up, by id; -1.0 for what couldn't be read.
-    using UserSettings = std::array<float, 17>;
+    // By id; -1.0 for what couldn't be read.
+    using UserSettings = std::array<float, vxcomn::kUserParameterCount>;
 
-    bool openPropertyStore(IMMDevice &device);
+    void openPropertyStore(IMMDevice &device);
     void storeDefaults();
     void loadApoModule();
     void subscribe();
     void unsubscribe();
 
-    // Subscribers (endpoint_preset.cpp).
+    // Subscribers.
     void takeClientMark();
     void setClientMark();
     void APOType_Changing();
     void APOType_Changed();
-    void initializeApo(vxcomn::ApoType type);
     void PresetFilePath_Changing() {}
     void PresetFilePath_Changed();
     void ParamRegKeyName_Changing() {}
     void ParamRegKeyName_Changed();
-    void keepUserSettings();
-    UserSettings readUserSettings();
-    bool storeFitsPreset(const vxcomn::RegistryKey &key) const;
+    void ParamRegKeyName_ChangedEarly();
 
-    std::optional<UserSettings> KeptSettings_;
-    vxcomn::WideString KeptFor_;  // the parameter key that they stood in
+    void initializeApo(int32_t type);
+    bool storeFitsPreset(const vxcomn::RegistryKey &key) const;
+    bool storeHoldsSetting(const vxcomn::WideString &key, const vxcomn::UserParameter &parameter) const;
+    UserSettings readUserSettings();
+    void keepUserSettings();
+
+    bool ChecksConsistency_ = false;  // ParamRegKeyName has its subscriber
 };

@@ -13,6 +13,8 @@ namespace vxcomn {
 // The context behind a handle; null for any other address.
 VXAPOCOMAPI_APIContext *findApi(const void *handle) noexcept;
 VXAPOCOMAPI_EndpointContext *findEndpoint(const void *handle) noexcept;
+// The same, and calls `enter` before the handle can be withdrawn: what it marks is seen by whoever frees the endpoint.
+VXAPOCOMAPI_EndpointContext *findEndpoint(const void *handle, void (*enter)(VXAPOCOMAPI_EndpointContext &)) noexcept;
 
 // The client that a handle of either kind belongs to; null for any other address.
 VXAPOCOMAPI_APIContext *findClient(const void *handle) noexcept;

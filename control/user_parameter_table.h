@@ -21,6 +21,7 @@ enum class UserParameterKind : uint8_t {
     band,   // band record
 };
 
+inline constexpr int32_t kUserParameterCount = 17;
 inline constexpr int kBandCount = 10;
 inline constexpr int32_t kFirstBand = 6;         // id of band 1
 inline constexpr int32_t kFirstBandParam = 117;  // and its parameter

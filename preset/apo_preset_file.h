@@ -9,7 +9,7 @@
 //         -> UserProfileName -> EngineConfig -> EngineShortName -> ParamRegKeyName        (chain.cpp)
 //
 // and from there the store is the truth: seeded from the preset (seeding.cpp), overruled by what applications force
-// (forced_selection.cpp), and walked for what is new (update_walk.cpp).
+// (forced_selection.cpp), and walked for what is new (configuration_walk.cpp, parameter_walk.cpp).
 //
 // Control threads, never the block path: a handler may wait for the registry and up to 5 s for the slot's mutex. Locks: the state
 // lock first, then Mutex. The parameter walk, and with it the stamps, the pending changes and the known clients, belongs to one
@@ -29,6 +29,7 @@
 #include "preset/change_record.h"
 #include "preset/global_mutex.h"
 #include "preset/instance_id.h"
+#include "preset/package_reader.h"
 #include "preset/parameter_store.h"
 #include "preset/preset_reader.h"
 #include "preset/reactive_property.h"
@@ -60,6 +61,14 @@ struct WalkMemory {
     std::array<uint64_t, kComponentCount> componentStamps = {};
     std::array<std::array<uint64_t, kParamCount>, kComponentCount> parameterStamps = {};  // with kStampUnread
     KnownClients clients;
+
+    // Every parameter counts as new again, those of the clients as well.
+    void forgetParameters() {
+        parametersStamp = 0;
+        componentStamps.fill(0);
+        for (auto &stamps : parameterStamps) stamps.fill(0);
+        for (auto &[client, stamps] : clients) stamps.clear();
+    }
 };
 
 // Stops and deletes the polling thread (update_thread.cpp).
@@ -199,9 +208,22 @@ struct CAPOPresetFile : CInstanceIDBase, protected vxcomn::PresetOwner {
     void link(Link &property);
     template <auto changing, auto changed, class Link>
     void unlink(Link &property);
-    void deriveDeviceIdentity();
-    void deriveEndpointIndex();
+    void deriveDeviceIdentity(IPropertyStore *store);
+    void deriveEndpointIndex(IPropertyStore *store);
     void findPreset();
+    vxcomn::OpenedPreset openPreset(const vxcomn::WideString &path);
+    void savePresetHash(const vxcomn::WideString &keyPath);
+
+    // Sets a property to what the store forces, unless that is nothing or stands already.
+    void adopt(Text &property, const vxcomn::WideString &value, const VXWCHAR *traceName, const VXWCHAR *format);
+    void writeDerivedIOConfig(const vxcomn::WideString &keyPath, vxcomn::WideView name);
+    void restorePresetEngine();
+
+    vxcomn::WideString parameterKeyFor(vxcomn::WideView apoType, vxcomn::WideView ioConfig, vxcomn::WideView contentType) const;
+    bool addKeysOfPackage(const vxcomn::WideString &archive, vxcomn::WideView apoType, std::vector<vxcomn::WideString> &keys);
+    void addKeysOfLooseTree(vxcomn::WideView apoType, std::vector<vxcomn::WideString> &keys);
+
+    bool EngineForced_ = false;  // the engine in force is, or was, an application's choice
 
     vxcomn::WalkMemory Walk_;
     // Set on any thread; the parameter walk then forgets its stamps before it begins.

@@ -14,6 +14,9 @@ namespace vxcomn {
 // E_FAIL: a value whose setter is gone.
 inline constexpr Status kSetterGone = 0x80004005;
 
+// Opens a configuration key for reading; none if there is none, or the path is empty.
+RegistryKey openConfiguration(WideView keyPath);
+
 // Each takes the open configuration key.
 
 // Empty if nothing is forced.
