@@ -8,9 +8,11 @@
 #include <exception>
 #include <iostream>
 
+#include "tools/vx/run_verb.h"
 #include "tools/vx/system.h"
 #include "tools/vx/verb.h"
 #include "tools/vx_client/client_verbs.h"
+#include "tools/vx_client/endpoint_follower.h"
 #include "tools/vx_measure/measure_verbs.h"
 #include "tools/vx_preset/preset_verbs.h"
 
@@ -47,7 +49,7 @@ int runVx(int argc, char **argv) {
         "Exit status: 0 well; 1 a check failed or something was found; 2 usage; 3 an input is not usable; 4 the system refused.\n"
         "Environment: NO_COLOR turns colour off; VX_GNUPLOT names the gnuplot to draw with.");
     int exitStatus = 0;
-    vx::addRunVerb(app, exitStatus);
+    vx::addRunVerb(app, vx::followEndpoint);
     vx::addLevelsVerb(app, exitStatus);
     vx::addJoinVerb(app, exitStatus);
     vx::addMeasureVerbs(app, exitStatus);

@@ -1,10 +1,10 @@
 // SPDX-License-Identifier: MIT
 #include "tools/vx_client/device_list.h"
 
+#include <VXDSPAPI.h>
+
 #include "platform/endpoints.h"
-#include "platform/guid.h"
 #include "platform/variant.h"
-#include "preset/endpoint_class.h"
 #include "preset/endpoint_id.h"
 #include "tools/vx/text.h"
 #include "tools/vx/verb.h"
@@ -22,52 +22,31 @@ constexpr GUID kEndpointFormat = {0x1DA5D803, 0xD492, 0x4EDD, {0x8C, 0x23, 0xE0,
 constexpr PROPERTYKEY kDisableEffects = {kEndpointFormat, 5};
 constexpr PROPERTYKEY kHardwareKey = {{0xB3F8FA53, 0x0004, 0x438E, {0x90, 0x03, 0x51, 0xA4, 0x6E, 0x13, 0x9B, 0xFC}}, 2};
 
-PropertyAnswer readProperty(IPropertyStore &store, const PROPERTYKEY &key) {
-    PropertyAnswer answer;
+// The text of a property; empty where it is none.
+WideString textOf(IPropertyStore &store, const PROPERTYKEY &key) {
     OwnedPropVariant value;
-    answer.result = store.GetValue(key, value.put());
-    if (FAILED(answer.result)) return answer;
-    answer.type = value->vt;
-    if (value->vt == VT_UI4) answer.number = value->ulVal;
-    if (value->vt == VT_LPWSTR && value->pwszVal != nullptr) answer.text = value->pwszVal;
-    return answer;
+    if (FAILED(store.GetValue(key, value.put())) || value->vt != VT_LPWSTR || value->pwszVal == nullptr) return {};
+    return value->pwszVal;
 }
 
-GUID guidOf(const GuidBytes &bytes) {
-    GUID guid = {};
-    for (size_t i = 0; i < 4; ++i) guid.Data1 = guid.Data1 << 8 | bytes[i];
-    guid.Data2 = static_cast<uint16_t>(bytes[4] << 8 | bytes[5]);
-    guid.Data3 = static_cast<uint16_t>(bytes[6] << 8 | bytes[7]);
-    for (size_t i = 0; i < 8; ++i) guid.Data4[i] = bytes[8 + i];
-    return guid;
+bool isSwitchedOn(IPropertyStore &store, const PROPERTYKEY &key) {
+    OwnedPropVariant value;
+    return SUCCEEDED(store.GetValue(key, value.put())) && value->vt == VT_UI4 && value->ulVal != 0;
 }
-
-class StoreReader final : public PropertyReader {
-  public:
-    explicit StoreReader(IPropertyStore &store) : store_(store) {}
-    PropertyAnswer read(const PropertyName &name) override { return readProperty(store_, {guidOf(name.format), name.id}); }
-
-  private:
-    IPropertyStore &store_;
-};
 
 void readProperties(IPropertyStore &store, Device &device) {
     device.hasProperties = true;
-    WideString name = readProperty(store, kFriendlyName).text;
-    if (name.empty()) name = readProperty(store, kDescription).text;
+    WideString name = textOf(store, kFriendlyName);
+    if (name.empty()) name = textOf(store, kDescription);
     device.name = printable(toUtf8(name));
-    device.effectsOff = readProperty(store, kDisableEffects).number != 0;
-    const PropertyAnswer hardware = readProperty(store, kHardwareKey);
-    if (hardware.type == kPropertyText) {
-        DeviceIdentity identity = deviceIdentity(hardware.text);
-        device.deviceId = std::move(identity.deviceId);
-        device.subsystemId = std::move(identity.ssid);
-    }
-    StoreReader reader(store);
+    device.effectsOff = isSwitchedOn(store, kDisableEffects);
+    DeviceIdentity identity = deviceIdentity(textOf(store, kHardwareKey));
+    device.deviceId = std::move(identity.deviceId);
+    device.subsystemId = std::move(identity.ssid);
     uint32_t index = UINT32_MAX;
-    devicePropsToEndpointIndex(reader, index, nullptr);
+    VXDSPAPI_DevicePropsToEndpointIndex(nullptr, &store, &index);
     device.index = static_cast<int32_t>(index);
-    if (const VXWCHAR *const derived = devicePropsToIOConfig(reader, nullptr)) device.derivedIoConfig = derived;
+    if (const VXWCHAR *const derived = VXDSPAPI_DevicePropsToIOConfig(nullptr, &store)) device.derivedIoConfig = derived;
 }
 
 // Nothing if the endpoint went away meanwhile.
