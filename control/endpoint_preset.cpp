@@ -7,10 +7,10 @@
 #include <algorithm>
 #include <cstring>
 
-#include "VXAPOCOMAPI.h"
 #include "control/endpoint_context.h"
 #include "control/last_error.h"
 #include "control/preset_tables.h"
+#include "control/user_parameters.h"
 #include "platform/security.h"
 #include "preset/parameter_store.h"
 
@@ -155,7 +155,7 @@ VXAPOCOMAPI_EndpointContext::UserSettings VXAPOCOMAPI_EndpointContext::readUserS
     for (int32_t id = 0; id < kUserParameterCount; ++id) {
         const UserParameter *const parameter = findUserParameter(engine, static_cast<uint32_t>(id));
         if (parameter == nullptr || !storeHoldsSetting(key, *parameter)) continue;
-        settings[static_cast<size_t>(id)] = VXAPOCOMAPI_GetUserParameter(this, id);
+        settings[static_cast<size_t>(id)] = readUserParameter(*this, id);
     }
     return settings;
 }
@@ -163,6 +163,7 @@ VXAPOCOMAPI_EndpointContext::UserSettings VXAPOCOMAPI_EndpointContext::readUserS
 void VXAPOCOMAPI_EndpointContext::keepUserSettings() {
     // No call of the client's, so no business of its last error.
     const int32_t lastError = ApiContext->LastError;
+    const GlobalMutexLock slot(Mutex);
     // A key that comes up while the preset is opened does so ahead of the ranges that the settings are measured by.
     PresetTables tables(*this);
     LoadPreset(LOAD_PRESET_PARAMETERS, &tables);
@@ -170,7 +171,7 @@ void VXAPOCOMAPI_EndpointContext::keepUserSettings() {
     ResetParameters(false, false);
     for (int32_t id = 0; id < kUserParameterCount; ++id) {
         const float value = settings[static_cast<size_t>(id)];
-        if (value != kUnread) VXAPOCOMAPI_SetUserParameter(this, static_cast<uint32_t>(id), value);
+        if (value != kUnread) setUserParameter(*this, static_cast<uint32_t>(id), value);
     }
     storeLastError(*ApiContext, lastError);
 }

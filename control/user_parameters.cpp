@@ -135,7 +135,9 @@ std::optional<float> sliderOf(Endpoint &endpoint, const UserParameter &parameter
     return std::nullopt;
 }
 
-float read(Endpoint &endpoint, int32_t id) {
+}  // namespace
+
+float readUserParameter(VXAPOCOMAPI_EndpointContext &endpoint, int32_t id) {
     VXAPOCOMAPI_APIContext &api = *endpoint.ApiContext;
     if (!hasSlot(endpoint)) {
         failWith(api, endpoint, VXAPOCOMAPI_ERROR_APO_TYPE_NOT_SET);
@@ -165,8 +167,6 @@ float read(Endpoint &endpoint, int32_t id) {
     succeed(endpoint);
     return *value;
 }
-
-}  // namespace
 
 int32_t setUserParameter(VXAPOCOMAPI_EndpointContext &endpoint, uint32_t id, float value) {
     const bool isGlobal = (id & VXAPOCOMAPI_IS_GLOBAL) != 0;
@@ -198,7 +198,7 @@ float getUserParameter(VXAPOCOMAPI_EndpointContext &endpoint, int32_t id) {
         return 0.0F;
     }
     const InsideCall inside(endpoint.InGetUserParameter);
-    return read(endpoint, id);
+    return readUserParameter(endpoint, id);
 }
 
 }  // namespace vxcomn

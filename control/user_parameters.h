@@ -30,6 +30,8 @@ bool writeParameter(VXAPOCOMAPI_EndpointContext &endpoint, const ParameterWrite 
 int32_t setUserParameter(VXAPOCOMAPI_EndpointContext &endpoint, uint32_t id, float value);
 // VXAPOCOMAPI_GetUserParameter.
 float getUserParameter(VXAPOCOMAPI_EndpointContext &endpoint, int32_t id);
+// The same without the check for a call inside another: for who must not take another thread's call for an answer of 0.
+float readUserParameter(VXAPOCOMAPI_EndpointContext &endpoint, int32_t id);
 
 // Marks that a call is inside, for a scope.
 class InsideCall {

@@ -148,7 +148,7 @@ bool WriteParameter(const CTraceFuncCallTarget *trace, WideView parameterKey, in
         whole = inOneWrite([&] { return writeSteps(parameterKey, component, name, data, guid, written, steps); });
         if (written == 0 && steps.key == status::ok) {
             steps.key = whole;  // it did not come to the first step
-        } else if (steps.component == status::ok && steps.keyStamp == status::ok) {
+        } else if (steps.key == status::ok && steps.component == status::ok && steps.keyStamp == status::ok) {
             if (whole != status::ok) steps.componentStamp = whole;  // each step went well, and yet all together did not
         }
     }
