@@ -155,6 +155,11 @@ struct WalkHost : CAPOPresetFile {
             return std::any_of(polls.begin() + static_cast<std::ptrdiff_t>(std::min(first, polls.size())), polls.end(), condition);
         });
     }
+    // What was found so far, while a thread goes on finding.
+    std::vector<Poll> seen() {
+        const std::lock_guard guard(mutex_);
+        return polls;
+    }
     size_t pollCount() {
         const std::lock_guard guard(mutex_);
         return polls.size();
