@@ -140,15 +140,15 @@ void ChangeStream::deliver(uint32_t milliseconds) {
     const bool all = force_;
     const auto begin = std::chrono::steady_clock::now();
     force_ = false;
-    if (VXAPOCOMAPI_ReceiveParamChange(session_.handle(), &blob, &size, &count, all ? 0 : milliseconds, all ? 1 : 0) == 1) {
-        listener_.onParameters(parseChanges(blob, size, count), all);
-        return;
-    }
-    if (all) return;
-    if (std::chrono::steady_clock::now() - begin < kNoWait) {
-        std::unique_lock lock(mutex_);
-        if (!selectionWaits_ && !stopping_) taken_.wait_for(lock, kPoll, [this] { return selectionWaits_ || stopping_.load(); });
-    }
+    const bool news =
+        VXAPOCOMAPI_ReceiveParamChange(session_.handle(), &blob, &size, &count, all ? 0 : milliseconds, all ? 1 : 0) == 1;
+    if (news) listener_.onParameters(parseChanges(blob, size, count), all);
+    const bool waited = news || all || std::chrono::steady_clock::now() - begin >= kNoWait;
+    idleWaits_ = waited ? 0 : idleWaits_ + 1;
+    // One such wait may be a cancel that found nobody waiting.
+    if (idleWaits_ < 2) return;
+    std::unique_lock lock(mutex_);
+    taken_.wait_for(lock, kPoll, [this] { return selectionWaits_ || stopping_.load(); });
 }
 
 void ChangeStream::receiveParameters() {

@@ -79,6 +79,7 @@ class ChangeStream {
     Selections initial_, selections_;
     std::string state_;
     bool force_ = true;
+    int idleWaits_ = 0;  // in a row that ended at once without news
     std::atomic<bool> stopping_ = false;
     std::mutex mutex_;
     std::condition_variable taken_;

@@ -37,6 +37,11 @@ std::optional<double> millisecondsSince(uint64_t stamp) {
     return elapsed >= 0.0 && elapsed < kLongestDelayMs ? std::optional(elapsed) : std::nullopt;
 }
 
+// A name from the store is data: it may name a module, never a path.
+bool isModuleName(const std::string &engine) {
+    return !engine.empty() && engine.find_first_of("/\\:") == std::string::npos;
+}
+
 // Names the slot as one whose effects run, for as long as it lives.
 vxcomn::NamedMutex markReceiver(const Session &session, bool quiet) {
     const vxcomn::WideString key = vxcomn::configurationKey(session.device().storeName, vxcomn::toWide(session.apo()));
@@ -61,6 +66,9 @@ class EndpointFollower final : public RunFollower, private ChangeListener {
             throw Failure(ExitStatus::input,
                           session_.device().name + ", " + session_.apo() +
                               ": the slot has no engine, because it has no preset; vx doctor tells why, and --engine names one");
+        if (!fixedEngine_ && !isModuleName(engine_))
+            throw Failure(ExitStatus::input, session_.device().name + ", " + session_.apo() + ": the slot's engine \"" + engine_ +
+                                                 "\" is no module name; vx doctor tells who chose it, and --engine names another");
         say("follow: " + session_.device().name + ", " + session_.apo() + ", engine " +
             (engine_.empty() ? "-" : printable(engine_)));
     }
@@ -124,7 +132,7 @@ class EndpointFollower final : public RunFollower, private ChangeListener {
         noteSelection("configuration", before.ioConfig, now.ioConfig, now.ioConfigSetter);
         noteSelection("profile", before.profile, now.profile, {});
         noteSelection("content", before.content, now.content, {});
-        if (!now.engine.empty()) engine_ = now.engine;
+        if (isModuleName(now.engine)) engine_ = now.engine;
     }
 
     void onEndpoint(const std::string &state) override { say("follow: the endpoint is " + state + "; the sound goes on as it is"); }

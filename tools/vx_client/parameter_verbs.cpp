@@ -37,7 +37,7 @@ Reading readUser(const Session &session, const UserParameter &parameter) {
 
 Json readingJson(const Reading &reading) {
     Json json = {{"name", reading.parameter->name}, {"id", reading.parameter->id}};
-    json["value"] = reading.problem.empty() ? Json(reading.value) : Json();
+    json["value"] = reading.problem.empty() ? Json(userValueNumber(reading.value)) : Json();
     if (!reading.problem.empty()) json["problem"] = reading.problem;
     return json;
 }

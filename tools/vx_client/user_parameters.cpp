@@ -1,6 +1,8 @@
 // SPDX-License-Identifier: MIT
 #include "tools/vx_client/user_parameters.h"
 
+#include <cmath>
+
 #include "tools/vx/text.h"
 #include "tools/vx/verb.h"
 
@@ -62,6 +64,11 @@ float parseUserValue(const UserParameter &parameter, const std::string &text) {
     if (!number || *number < 0.0 || *number > 1.0)
         throw Failure(ExitStatus::usage, std::string(parameter.name) + " " + text + ": expected a level from 0 to 1");
     return static_cast<float>(*number);
+}
+
+double userValueNumber(float value) {
+    constexpr double kSteps = 100000.0;
+    return std::round(static_cast<double>(value) * kSteps) / kSteps;
 }
 
 std::string userValueText(const UserParameter &parameter, float value) {

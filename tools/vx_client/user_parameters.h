@@ -31,6 +31,8 @@ const UserParameter *userParameterAt(int32_t componentId, int32_t paramId);
 // A level from 0 to 1, or on and off.
 float parseUserValue(const UserParameter &parameter, const std::string &text);
 
+// The five decimals that the library keeps, for documents.
+double userValueNumber(float value);
 std::string userValueText(const UserParameter &parameter, float value);
 
 // A line each, for --help.

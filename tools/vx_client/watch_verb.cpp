@@ -120,7 +120,7 @@ class Watcher final : public ChangeListener {
     static Json json(const ParameterChange &change, const Value *value) {
         if (value == nullptr) return {};
         Json result = rawJson(change.componentId, change.paramId, value->data);
-        if (value->level) result["level"] = *value->level;
+        if (value->level) result["level"] = userValueNumber(*value->level);
         return result;
     }
 
