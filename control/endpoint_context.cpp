@@ -92,7 +92,7 @@ void VXAPOCOMAPI_EndpointContext::loadApoModule() {
 void VXAPOCOMAPI_EndpointContext::subscribe() {
     using Self = VXAPOCOMAPI_EndpointContext;
     const std::lock_guard guard(stateLock());
-    ParamRegKeyName.addChanged(handlerOf<&Self::ParamRegKeyName_ChangedEarly>(this));
+    Reseeding = handlerOf<&Self::reseed>(this);
     APOTypeRegKeyName.addChanging(handlerOf<&Self::takeClientMark>(this));
     APOTypeRegKeyName.addChanged(handlerOf<&Self::setClientMark>(this));
     setClientMark();
@@ -110,7 +110,7 @@ void VXAPOCOMAPI_EndpointContext::unsubscribe() {
     APOType.removeChanging(handlerOf<&Self::APOType_Changing>(this));
     APOTypeRegKeyName.removeChanged(handlerOf<&Self::setClientMark>(this));
     APOTypeRegKeyName.removeChanging(handlerOf<&Self::takeClientMark>(this));
-    ParamRegKeyName.removeChanged(handlerOf<&Self::ParamRegKeyName_ChangedEarly>(this));
+    Reseeding = {};
 }
 
 void VXAPOCOMAPI_EndpointContext::takeClientMark() {

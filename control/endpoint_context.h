@@ -120,13 +120,12 @@ struct VXAPOCOMAPI_EndpointContext final : CAPOPresetFile {
     void PresetFilePath_Changed();
     void ParamRegKeyName_Changing() {}
     void ParamRegKeyName_Changed();
-    void ParamRegKeyName_ChangedEarly();
 
     void initializeApo(int32_t type);
     bool storeFitsPreset(const vxcomn::RegistryKey &key) const;
     bool storeHoldsSetting(const vxcomn::WideString &key, const vxcomn::UserParameter &parameter) const;
+    bool storeHoldsSettings() const;
     UserSettings readUserSettings();
-    void keepUserSettings();
-
-    bool ChecksConsistency_ = false;  // ParamRegKeyName has its subscriber
+    void resetKeepingSettings();
+    void reseed();
 };

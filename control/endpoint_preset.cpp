@@ -2,8 +2,7 @@
 //
 // What follows from the choice of a slot: the direct line to the effect module, what the preset says about sliders, and a store
 // that fits the preset. A preset that is not the one that the store was filled from replaces everything but the seventeen settings
-// of the user, which are read before and written back behind it. The property graph fills a store that does not fit by itself, so
-// they are read as soon as the store's key is known, ahead of that.
+// of the user, which are read before and written back behind it.
 #include <algorithm>
 #include <cstring>
 
@@ -49,7 +48,6 @@ void VXAPOCOMAPI_EndpointContext::APOType_Changed() {
     PresetFilePath_Changed();
     ParamRegKeyName.addChanging(handlerOf<&Self::ParamRegKeyName_Changing>(this));
     ParamRegKeyName.addChanged(handlerOf<&Self::ParamRegKeyName_Changed>(this));
-    ChecksConsistency_ = true;
     ParamRegKeyName_Changed();
 }
 
@@ -61,7 +59,6 @@ void VXAPOCOMAPI_EndpointContext::APOType_Changing() {
     PresetFilePath.removeChanged(handlerOf<&Self::PresetFilePath_Changed>(this));
     ParamRegKeyName.removeChanging(handlerOf<&Self::ParamRegKeyName_Changing>(this));
     ParamRegKeyName.removeChanged(handlerOf<&Self::ParamRegKeyName_Changed>(this));
-    ChecksConsistency_ = false;
     if (ApoHandle != nullptr && ApoFree != nullptr) {
         ApoFree(ApoHandle);
         ApoHandle = nullptr;
@@ -113,23 +110,16 @@ void VXAPOCOMAPI_EndpointContext::ParamRegKeyName_Changed() {
         return;
     }
     key.close();
-    log(VX_TEXT("Resetting parameters in the regsitry by reading them from the preset file...\n"));
-    keepUserSettings();
+    resetKeepingSettings();
 }
 
-// The key comes up while the preset is being opened for the first time, which is before the slot has its subscriber for it. Where a
-// user's settings are at stake the check is made at once.
-void VXAPOCOMAPI_EndpointContext::ParamRegKeyName_ChangedEarly() {
-    const WideString path = ParamRegKeyName.get();
-    RegistryKey key;
-    if (ChecksConsistency_ || path.empty()) return;
-    if (RegistryKey::open(RegistryRoot::localMachine, path, RegistryAccess::read, key) != status::ok) return;
-    if (storeFitsPreset(key)) return;
-    key.close();
-    const WideString engine = EngineShortName.get();
-    for (int32_t id = 0; id < kUserParameterCount; ++id) {
-        const UserParameter *const parameter = findUserParameter(engine, static_cast<uint32_t>(id));
-        if (parameter != nullptr && storeHoldsSetting(path, *parameter)) return ParamRegKeyName_Changed();
+// Where the property graph finds a store that doesn't fit by itself: a key that comes up while the preset is opened for the first
+// time does so before the slot has its subscriber for it, and one that it comes back to doesn't move.
+void VXAPOCOMAPI_EndpointContext::reseed() {
+    if (storeHoldsSettings()) {
+        resetKeepingSettings();
+    } else {
+        ResetParameters(false, false);
     }
 }
 
@@ -143,6 +133,16 @@ bool VXAPOCOMAPI_EndpointContext::storeHoldsSetting(const WideString &key, const
     uint8_t value[kLargestUserParameter];
     uint32_t size = parameter.bytes;
     return ReadParameterValue(key, parameter.component, parameter.param, value, size, nullptr, nullptr) == status::ok;
+}
+
+bool VXAPOCOMAPI_EndpointContext::storeHoldsSettings() const {
+    const WideString engine = EngineShortName.get();
+    const WideString key = ParamRegKeyName.get();
+    for (int32_t id = 0; id < kUserParameterCount; ++id) {
+        const UserParameter *const parameter = findUserParameter(engine, static_cast<uint32_t>(id));
+        if (parameter != nullptr && storeHoldsSetting(key, *parameter)) return true;
+    }
+    return false;
 }
 
 // Settings that the store doesn't hold aren't asked for: asking would fill it from the preset and cost those that are still to be
@@ -160,7 +160,8 @@ VXAPOCOMAPI_EndpointContext::UserSettings VXAPOCOMAPI_EndpointContext::readUserS
     return settings;
 }
 
-void VXAPOCOMAPI_EndpointContext::keepUserSettings() {
+void VXAPOCOMAPI_EndpointContext::resetKeepingSettings() {
+    log(VX_TEXT("Resetting parameters in the regsitry by reading them from the preset file...\n"));
     // No call of the client's, so no business of its last error.
     const int32_t lastError = ApiContext->LastError;
     const GlobalMutexLock slot(Mutex);

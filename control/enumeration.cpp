@@ -164,7 +164,8 @@ HRESULT EndpointIndexToEndpointID(VXAPOCOMAPI_APIContext &api, int32_t index, Wi
     UINT count = 0;
     HRESULT result = api.DeviceEnumerator->EnumAudioEndpoints(eRender, DEVICE_STATE_ACTIVE | DEVICE_STATE_UNPLUGGED, devices.put());
     if (SUCCEEDED(result)) result = devices->GetCount(&count);
-    for (UINT at = 0; SUCCEEDED(result) && at < count; ++at) {
+    if (FAILED(result)) count = 0;
+    for (UINT at = 0; at < count; ++at) {
         ComPtr<IMMDevice> device;
         ComPtr<IPropertyStore> properties;
         if (result = devices->Item(at, device.put()); FAILED(result)) continue;

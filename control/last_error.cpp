@@ -43,7 +43,8 @@ int32_t failWithWindowsError(VXAPOCOMAPI_APIContext &api, Status error) noexcept
     GlobalWindowsLastError = error;
     if (api.TraceTarget == nullptr || api.TraceTarget->Enabled == 0) return 0;
     try {
-        api.log(VX_TEXT("Error: %i. Windows error: (%i) %s\n"), VXAPOCOMAPI_ERROR_WINDOWS_ERRORCODE, error, errorText(error));
+        constexpr int32_t code = VXAPOCOMAPI_ERROR_WINDOWS_ERRORCODE;
+        api.log(VX_TEXT("Error: %i. Windows error: (%i) %s\n"), code, error, errorText(error));
     } catch (const std::exception &) {
         return 0;  // the line is lost, not the error
     }

@@ -3,6 +3,7 @@
 // Presets and the parameter store: finding the preset of the present selection, loading it, and copying it into the store, which is
 // the truth from then on. The store's hash says which preset seeded it.
 #include <algorithm>
+#include <mutex>
 
 #include "platform/last_error.h"
 #include "platform/security.h"
@@ -109,6 +110,8 @@ bool CAPOPresetFile::LoadPreset(uint32_t flags, PresetParameters *parameters) {
 
 bool CAPOPresetFile::ResetParameters(bool wholeTree, bool keepPower) {
     const TraceScope scope(TraceTarget, VX_TEXT("ResetParameters"));
+    // Properties are read below, and whoever holds the state lock may be waiting for the mutex.
+    const std::lock_guard guard(StateLock_);
     const GlobalMutexLock lock(Mutex);
     const WideString key = ParamRegKeyName.get();
     if (key.empty()) return true;
@@ -148,10 +151,15 @@ bool CAPOPresetFile::ResetParameter(int32_t ComponentId, int32_t ParamId, bool) 
 }
 
 bool CAPOPresetFile::EnsureParametersAreInRegistry() {
+    const std::lock_guard guard(StateLock_);
     const GlobalMutexLock lock(Mutex);
     logHash(*this, VX_TEXT("Preset file hash = %X%X%X%X%X%X%X%X\n"), PresetHash);
     if (vxcomn::PresetHash stored = {}; GetPresetHash(stored) && stored == PresetHash) return false;
-    ResetParameters(false, false);
+    if (Reseeding.call != nullptr) {
+        Reseeding.call(Reseeding.object);
+    } else {
+        ResetParameters(false, false);
+    }
     return true;
 }
 

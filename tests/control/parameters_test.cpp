@@ -140,7 +140,7 @@ TEST_CASE_FIXTURE(OpenSlot, "raw calls are traced with their arguments, the expo
     uint32_t size = 8;
     const auto set = linesOf([&] { VXAPOCOMAPI_SetUserParameterEx(handle(), 4, -5, -1, room, 3, 1, 1, nullptr, nullptr); });
     REQUIRE_FALSE(set.empty());
-    CHECK(set.front().rfind("VXAPOCOMAPI_SetUserParameterEx", 0) == 0);
+    CHECK(set.front().rfind("{ VXAPOCOMAPI_SetUserParameterEx(apoComHandle = 0x", 0) == 0);
     CHECK(set.front().find(", componentId = 4, paramId = -5, dataSize = 3, IsGlobal = 1, isTransient = 1") != std::string::npos);
     const auto get = linesOf([&] { VXAPOCOMAPI_GetUserParameterEx(handle(), -1, -2, -1, room, &size, nullptr, nullptr); });
     REQUIRE_FALSE(get.empty());
