@@ -4,6 +4,7 @@
 // the truth from then on. The store's hash says which preset seeded it.
 #include <algorithm>
 #include <mutex>
+#include <optional>
 
 #include "platform/last_error.h"
 #include "platform/security.h"
@@ -93,7 +94,9 @@ void CAPOPresetFile::findPreset() {
     EngineShortName.set({});
 }
 
+// Under the state lock, since the hash and the engine are the object's own.
 bool CAPOPresetFile::LoadPreset(uint32_t flags, PresetParameters *parameters) {
+    const std::lock_guard guard(StateLock_);
     const WideString path = PresetFilePath.get();
     WideString arguments = VX_TEXT("PresetFilePath = ") + path + VX_TEXT(", LoadPresetFlags = 0x");
     appendHexadecimal(arguments, flags);
@@ -187,9 +190,22 @@ bool CAPOPresetFile::GetParameter(int32_t ComponentId, int32_t ParamId, int32_t 
     const WideString key = ParamRegKeyName.get();
     if (key.empty()) return false;
     const uint32_t room = size;
-    Status status = ReadParameterValue(key, ComponentId, ParamId, data, size, source, stamp);
+    const auto read = [&] {
+        size = room;
+        return ReadParameterValue(key, ComponentId, ParamId, data, size, source, stamp);
+    };
     // A value that does not fit is there: seeding would cost the user all others and change nothing.
-    if (status != status::ok && status != status::moreData) {
+    const auto isThere = [](Status found) { return found == status::ok || found == status::moreData; };
+    Status status = read();
+    std::unique_lock<StateLock> state(StateLock_, std::defer_lock);
+    std::optional<GlobalMutexLock> slot;
+    if (!isThere(status)) {
+        state.lock();
+        slot.emplace(Mutex);
+        // Whoever had the mutex may have been filling the store.
+        status = read();
+    }
+    if (!isThere(status)) {
         WideString arguments = VX_TEXT("ComponentId = ");
         appendValue(arguments, ComponentId);
         arguments += VX_TEXT(", ParamId = ");
@@ -200,8 +216,7 @@ bool CAPOPresetFile::GetParameter(int32_t ComponentId, int32_t ParamId, int32_t 
         log(VX_TEXT("Looks like preset hasn't been loaded in the registry, load it.\n"));
         setLastError(status::ok);
         ResetParameters(false, false);
-        size = room;
-        status = ReadParameterValue(key, ComponentId, ParamId, data, size, source, stamp);
+        status = read();
     }
     if (status != status::ok) setLastError(status);
     return status == status::ok;

@@ -16,8 +16,8 @@
 #include "tests/control/fake_endpoints.h"
 
 using namespace vxcomn;
+using test::CallLog;
 using test::Client;
-using test::ControlLog;
 
 namespace {
 
@@ -95,7 +95,7 @@ TEST_CASE("the signature and the kind stand in a live API context") {
 }
 
 TEST_CASE("a second Initialize of the same context says so and succeeds") {
-    const ControlLog log;
+    const CallLog log;
     const Client client;
     CHECK_FALSE(log.has("Already initialized."));
     CHECK(client.context().Initialize());
@@ -103,7 +103,7 @@ TEST_CASE("a second Initialize of the same context says so and succeeds") {
 }
 
 TEST_CASE("a client's beginning is logged step by step") {
-    const ControlLog log;
+    const CallLog log;
     const Client client;
     const auto &version = client.context().ModuleVersionBytes;
     const std::string bytes = std::to_string(version[0]) + ", " + std::to_string(version[1]) + ", " + std::to_string(version[2]) +
@@ -118,7 +118,7 @@ TEST_CASE("a client's beginning is logged step by step") {
 }
 
 TEST_CASE("a client's end is logged step by step") {
-    ControlLog log;
+    CallLog log;
     std::string handle;
     {
         const Client client;
@@ -143,19 +143,19 @@ TEST_CASE("without the switch nothing is logged") {
 }
 
 TEST_CASE("lines of two clients bear numbers of their own") {
-    const ControlLog log;
+    const CallLog log;
     const Client one, other;
     CHECK(one.context().InstanceId != other.context().InstanceId);
 }
 
 TEST_CASE("a context that could not be initialised says that it is freed already") {
-    const ControlLog log;
+    const CallLog log;
     { VXAPOCOMAPI_APIContext context; }
     CHECK(log.hasInOrder({"~VXAPOCOMAPI_APIContext", "{ VXAPOCOMAPI_APIContext::Free()", "Already freed."}));
 }
 
 TEST_CASE("an enumerator that won't unregister is let go of all the same") {
-    ControlLog log;
+    CallLog log;
     test::FakeEnumerator fake;
     fake.unregisterResult = E_FAIL;
     {
@@ -168,7 +168,7 @@ TEST_CASE("an enumerator that won't unregister is let go of all the same") {
 }
 
 TEST_CASE("what a client set as setter is taken back when it ends, and what fails is logged") {
-    ControlLog log;
+    CallLog log;
     const WideString there = VX_TEXT("Software\\Ondrevale\\VxcomnTestSetter"),
                      gone = VX_TEXT("Software\\Ondrevale\\VxcomnTestGone");
     const WideString text = VX_TEXT("x");
@@ -191,7 +191,7 @@ TEST_CASE("what a client set as setter is taken back when it ends, and what fail
 }
 
 TEST_CASE("a Windows error is stored in all four places and logged in words") {
-    const ControlLog log;
+    const CallLog log;
     const Client client;
     CHECK(failWithWindowsError(client.context(), status::accessDenied) == 0);
     CHECK(VXAPOCOMAPI_GetLastError(client.api) == VXAPOCOMAPI_ERROR_WINDOWS_ERRORCODE);

@@ -13,7 +13,7 @@
 
 using namespace vxcomn;
 using test::ApoCall;
-using test::ControlLog;
+using test::CallLog;
 using test::OpenEndpoint;
 
 namespace {
@@ -35,7 +35,7 @@ struct ApoModule {
 };
 
 struct HostedEndpoint {
-    ControlLog log;
+    CallLog log;
     ApoModule apo;
     OpenEndpoint open;
     test::ApoModuleCalls &calls = *apo.calls;

@@ -9,8 +9,8 @@
 #include "tests/control/fake_endpoints.h"
 
 using namespace vxcomn;
+using test::CallLog;
 using test::Client;
-using test::ControlLog;
 
 namespace {
 
@@ -18,7 +18,7 @@ constexpr PROPERTYKEY kFriendlyName = {{0xA45C254E, 0xDF1C, 0x4EFD, {0x80, 0x20,
 constexpr PROPERTYKEY kOwn = {{0x6A6414E7, 0x39E4, 0x491F, {0x8B, 0x8C, 0xC9, 0x02, 0x8A, 0xC7, 0xD6, 0x59}}, 77};
 
 struct Properties {
-    ControlLog log;
+    CallLog log;
     Client client;
     test::FakeEnumerator system;
     ComPtr<IMMDeviceEnumerator> real = std::move(client.context().DeviceEnumerator);

@@ -16,15 +16,15 @@
 #include "tests/control/fake_endpoints.h"
 
 using namespace vxcomn;
+using test::CallLog;
 using test::Client;
-using test::ControlLog;
 using test::OpenEndpoint;
 
 namespace {
 
 // A client over fake endpoints.
 struct FakeSystem {
-    ControlLog log;
+    CallLog log;
     Client client;
     test::FakeEnumerator system;
     ComPtr<IMMDeviceEnumerator> real = std::move(client.context().DeviceEnumerator);
@@ -42,7 +42,7 @@ struct FakeSystem {
 
 TEST_CASE_FIXTURE(OpenEndpoint, "GetEndpoint passing hardwareOnly 0 still opens in hardware-only mode and says so") {
     if (none()) return;
-    const ControlLog log;
+    const CallLog log;
     const Client other;
     VXAPOHandle const handle = VXAPOCOMAPI_GetEndpoint(other.api, machine.endpointId().c_str(), 0);
     REQUIRE(handle != nullptr);
@@ -59,7 +59,7 @@ TEST_CASE_FIXTURE(OpenEndpoint, "GetEndpoint passing hardwareOnly 0 still opens 
 }
 
 TEST_CASE("InitializeEx with a null GUID fails with -15, readable by a null handle") {
-    const ControlLog log;
+    const CallLog log;
     VXAPOCOMAPI_SetLastError(nullptr, 0);
     CHECK(VXAPOCOMAPI_InitializeEx("an id", nullptr, 3) == nullptr);
     CHECK(VXAPOCOMAPI_GetLastError(nullptr) == VXAPOCOMAPI_ERROR_ENDPOINT_NOT_AVAILABLE);
@@ -70,7 +70,7 @@ TEST_CASE("InitializeEx with a null GUID fails with -15, readable by a null hand
 
 TEST_CASE_FIXTURE(OpenEndpoint, "InitializeEx opens a render endpoint by its GUID, and Free ends both") {
     if (none()) return;
-    ControlLog log;
+    CallLog log;
     const std::string id = toUtf8(machine.endpointId());
     const std::string guid = id.substr(id.find(".{") + 1);
     VXAPOHandle const handle = VXAPOCOMAPI_InitializeEx("ignored", guid.c_str(), 0);
@@ -110,7 +110,7 @@ TEST_CASE_FIXTURE(OpenEndpoint, "Free of the last endpoint frees the API context
 
 TEST_CASE_FIXTURE(OpenEndpoint, "Initialize opens the endpoint of an index without a line to the effect module") {
     if (none()) return;
-    const ControlLog log;
+    const CallLog log;
     VXAPOHandle const handle = VXAPOCOMAPI_Initialize(7);
     REQUIRE(handle != nullptr);
     CHECK(test::endpointOf(handle).EndpointID == machine.endpointId());

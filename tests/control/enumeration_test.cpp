@@ -10,8 +10,8 @@
 #include "tests/control/fake_endpoints.h"
 
 using namespace vxcomn;
+using test::CallLog;
 using test::Client;
-using test::ControlLog;
 using test::FakeDevice;
 
 namespace {
@@ -20,7 +20,7 @@ constexpr PROPERTYKEY kInfoLine = {{0x83DA6326, 0x97A6, 0x4088, {0x94, 0x53, 0xA
 
 // A client whose system has the endpoints that a test gives it.
 struct Listing {
-    ControlLog log;
+    CallLog log;
     Client client;
     test::FakeEnumerator system;
     ComPtr<IMMDeviceEnumerator> real = std::move(client.context().DeviceEnumerator);

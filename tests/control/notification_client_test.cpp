@@ -9,8 +9,8 @@
 #include "tests/control/control_fixture.h"
 
 using namespace vxcomn;
+using test::CallLog;
 using test::Client;
-using test::ControlLog;
 
 namespace {
 
@@ -60,7 +60,7 @@ TEST_CASE("the notification client answers for itself and for IUnknown alone") {
 }
 
 TEST_CASE("each notification traces its name, and a property its key") {
-    ControlLog log;
+    CallLog log;
     const Client client;
     auto &listener = *client.context().NotificationClient.get();
     void *object = nullptr;
@@ -83,7 +83,7 @@ TEST_CASE("each notification traces its name, and a property its key") {
 }
 
 TEST_CASE("a notification client that the system holds on to outlives its owner in silence") {
-    ControlLog log;
+    CallLog log;
     VXAPOCOMAPI_APIContext::CMMNotificationClient *kept = nullptr;
     {
         const Client client;

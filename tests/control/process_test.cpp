@@ -216,7 +216,7 @@ TEST_CASE("a preset that is replaced by another one keeps the seventeen settings
     REQUIRE(VXAPOCOMAPI_SetAPOType(endpoint, "EFX") == 1);
     for (const auto &[id, value] : set) {
         CAPTURE(id);
-        CHECK(VXAPOCOMAPI_GetUserParameter(endpoint, id) == value);
+        CHECK(VXAPOCOMAPI_GetUserParameter(endpoint, id) == doctest::Approx(value).epsilon(1e-5));
     }
     uint8_t byte = 0;
     uint32_t size = 1;

@@ -9,8 +9,8 @@
 
 using namespace vxcomn;
 using namespace vxcomn::testing;
+using test::CallLog;
 using test::Client;
-using test::ControlLog;
 using test::OpenEndpoint;
 
 namespace {
@@ -87,7 +87,7 @@ TEST_CASE_FIXTURE(OpenEndpoint, "each of the five names has its number, and othe
 }
 
 TEST_CASE("choosing a slot is logged, and so is a wrong name") {
-    const ControlLog log;
+    const CallLog log;
     const OpenEndpoint open;
     if (open.none()) return;
     VXAPOCOMAPI_SetAPOType(open.endpoint, "sfx");
@@ -97,7 +97,7 @@ TEST_CASE("choosing a slot is logged, and so is a wrong name") {
 }
 
 TEST_CASE("a first choice opens the preset, fills the store and finds it consistent") {
-    const ControlLog log;
+    const CallLog log;
     const OpenEndpoint open;
     if (open.none()) return;
     REQUIRE(VXAPOCOMAPI_SetAPOType(open.endpoint, "EFX") == 1);
@@ -115,7 +115,7 @@ TEST_CASE("a first choice opens the preset, fills the store and finds it consist
 TEST_CASE_FIXTURE(OpenEndpoint, "setting the type that is set changes nothing") {
     if (none()) return;
     REQUIRE(VXAPOCOMAPI_SetAPOType(endpoint, "EFX") == 1);
-    ControlLog log;  // the context was made before it and stays silent
+    CallLog log;  // the context was made before it and stays silent
     const WideString key = SampleMachine::parametersPath();
     forgetPreset(key);
     CHECK(VXAPOCOMAPI_SetAPOType(endpoint, "EFX") == 1);
@@ -184,7 +184,7 @@ TEST_CASE_FIXTURE(OpenEndpoint, "the preset narrows the ranges, shapes the bands
 }
 
 TEST_CASE("a store filled from another preset keeps each user parameter that could be read") {
-    const ControlLog log;
+    const CallLog log;
     const WideString key = SampleMachine::parametersPath();
     OpenEndpoint first;
     if (first.none()) return;
