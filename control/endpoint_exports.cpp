@@ -35,9 +35,13 @@ VXAPOHandle openEndpoint(VXAPOCOMAPI_APIContext &api, const VXWCHAR *endpointId,
     return endpoint.release();
 }
 
-// Opens an endpoint on a client of its own, which nobody could free any more if that fails.
-VXAPOHandle openOn(VXAPOCOMAPI_APIContext *api, const VXWCHAR *endpointId, int32_t hardwareOnly, int32_t hostAPO) {
-    VXAPOHandle const endpoint = _VXAPOCOMAPI_GetEndpoint(api, endpointId, hardwareOnly, hostAPO, nullptr);
+// Opens an endpoint on a client of its own, which nobody could free any more if that fails. `open` traces through the client, so
+// it has returned before the client goes.
+template <class Open>
+VXAPOHandle openOnOwnClient(Open &&open) {
+    auto *const api = static_cast<VXAPOCOMAPI_APIContext *>(VXAPOCOMAPI_InitializeAPI());
+    if (api == nullptr) return nullptr;
+    VXAPOHandle const endpoint = open(*api);
     if (endpoint == nullptr) VXAPOCOMAPI_FreeAPI(api);
     return endpoint;
 }
@@ -94,35 +98,33 @@ int32_t VXAPOCOMAPI_FreeEndpoint(VXAPOHandle epHandle) {
 }
 
 VXAPOHandle VXAPOCOMAPI_Initialize(int32_t endpointIndex) {
-    return guarded<VXAPOHandle>(nullptr, [&]() -> VXAPOHandle {
-        auto *const api = static_cast<VXAPOCOMAPI_APIContext *>(VXAPOCOMAPI_InitializeAPI());
-        if (api == nullptr) return nullptr;
-        const TraceScope scope(api->TraceTarget, VX_TEXT("VXAPOCOMAPI_Initialize"));
-        api->log(VX_TEXT("endpointIndex = %i\n"), endpointIndex);
+    const auto open = [&](VXAPOCOMAPI_APIContext &api) {
+        const TraceScope scope(api.TraceTarget, VX_TEXT("VXAPOCOMAPI_Initialize"));
+        api.log(VX_TEXT("endpointIndex = %i\n"), endpointIndex);
         WideString id;
-        if (FAILED(EndpointIndexToEndpointID(*api, endpointIndex, id)))
-            failWith(*api, *api, VXAPOCOMAPI_ERROR_ENDPOINT_INDEX_NOT_FOUND);
-        return openOn(api, id.c_str(), 0, 0);
-    });
+        if (FAILED(EndpointIndexToEndpointID(api, endpointIndex, id)))
+            failWith(api, api, VXAPOCOMAPI_ERROR_ENDPOINT_INDEX_NOT_FOUND);
+        return _VXAPOCOMAPI_GetEndpoint(&api, id.c_str(), 0, 0, nullptr);
+    };
+    return guarded<VXAPOHandle>(nullptr, [&] { return openOnOwnClient(open); });
 }
 
 VXAPOHandle VXAPOCOMAPI_InitializeEx(const char *endpointId, const char *endpointGuid, int32_t hardwareOnly) {
-    return guarded<VXAPOHandle>(nullptr, [&]() -> VXAPOHandle {
-        auto *const api = static_cast<VXAPOCOMAPI_APIContext *>(VXAPOCOMAPI_InitializeAPI());
-        if (api == nullptr) return nullptr;
-        const TraceScope scope(api->TraceTarget, VX_TEXT("VXAPOCOMAPI_InitializeEx"));
+    const auto open = [&](VXAPOCOMAPI_APIContext &api) {
+        const TraceScope scope(api.TraceTarget, VX_TEXT("VXAPOCOMAPI_InitializeEx"));
         if (endpointGuid != nullptr) {
-            api->log(VX_TEXT("endpointId = %s, endpointGuid = %s, hardwareOnly = %i\n"), endpointId, endpointGuid, hardwareOnly);
+            api.log(VX_TEXT("endpointId = %s, endpointGuid = %s, hardwareOnly = %i\n"), endpointId, endpointGuid, hardwareOnly);
         } else {
-            api->log(VX_TEXT("endpointId = %s, endpointGuid = NULL, hardwareOnly = %i\n"), endpointId, hardwareOnly);
+            api.log(VX_TEXT("endpointId = %s, endpointGuid = NULL, hardwareOnly = %i\n"), endpointId, hardwareOnly);
         }
-        api->log(VX_TEXT("hardwareOnly = 1 (always hardware-only mode!)\n"));
-        api->log(VX_TEXT("Hardware-only mode.\n"));
+        api.log(VX_TEXT("hardwareOnly = 1 (always hardware-only mode!)\n"));
+        api.log(VX_TEXT("Hardware-only mode.\n"));
         WideString id(kRenderIdPrefix);
         const WideString guid = endpointGuid != nullptr ? toWide(endpointGuid) : WideString();
         if (id.size() + guid.size() < kEndpointIdUnits) id += guid;
-        return openOn(api, id.c_str(), 1, 1);
-    });
+        return _VXAPOCOMAPI_GetEndpoint(&api, id.c_str(), 1, 1, nullptr);
+    };
+    return guarded<VXAPOHandle>(nullptr, [&] { return openOnOwnClient(open); });
 }
 
 int32_t VXAPOCOMAPI_Free(VXAPOHandle epHandle) {

@@ -73,7 +73,7 @@ struct OpenSlot {
     }
 
     SampleMachine machine;
-    ControlLog log;
+    ControlLines log;
     std::unique_ptr<Client> client;
 };
 

@@ -52,7 +52,7 @@ RandomCaller::~RandomCaller() {
 const std::vector<RandomCaller::Weighted> &RandomCaller::actions() {
     using Self = RandomCaller;
     static const std::vector<Weighted> all = {
-        {2, &Self::initializeApi},     {2, &Self::freeApi},          {6, &Self::openEndpoint},    {6, &Self::freeEndpoint},
+        {4, &Self::initializeApi},     {2, &Self::freeApi},          {12, &Self::openEndpoint},   {6, &Self::freeEndpoint},
         {1, &Self::initializeByIndex}, {1, &Self::initializeByGuid}, {1, &Self::freeBoth},        {8, &Self::setSlot},
         {20, &Self::listEndpoints},    {60, &Self::getProperty},     {700, &Self::getErrors},     {300, &Self::setError},
         {30, &Self::select},           {150, &Self::tellSelection},  {200, &Self::defaultConfig}, {250, &Self::setUser},
@@ -211,7 +211,7 @@ void RandomCaller::freeEndpoint() {
 
 // That no endpoint has the index is overwritten by the failure to open none; the log keeps it.
 void RandomCaller::initializeByIndex() {
-    const ControlLog log;
+    const ControlLines log;
     VXAPOHandle const endpoint = VXAPOCOMAPI_Initialize(oneIn(3) ? 7 : someNumber());
     if (log.has("Error: -11")) codes_.insert(VXAPOCOMAPI_ERROR_ENDPOINT_INDEX_NOT_FOUND);
     if (endpoint != nullptr) expect(VXAPOCOMAPI_Free(endpoint) == 1, "what was initialised isn't freed");

@@ -68,8 +68,8 @@ struct HostLog : SwitchedLog {
 };
 
 // Of the control functions.
-struct ControlLog : SwitchedLog {
-    ControlLog() : SwitchedLog(VX_TEXT("VXCOMAPI"), "VXCOMAPIU") {}
+struct ControlLines : SwitchedLog {
+    ControlLines() : SwitchedLog(VX_TEXT("VXCOMAPI"), "VXCOMAPIU") {}
 };
 
 }  // namespace vxcomn::testing

@@ -101,7 +101,7 @@ TEST_CASE_FIXTURE(DoctorFixture, "parameters of another preset, power off and by
     finds("power", "wrong", "off", "power on");
     finds("bypass", "wrong", "on", "bypass off");
     putBytes(kSpeakersValues, "PresetSHA256", std::vector<uint8_t>(32, 7));
-    finds("parameters", "wrong", "0707", "brings them into line");
+    finds("parameters", "wrong", "0707", "which brings them into line");
     CHECK(get("bypass") == "on");
     finds("parameters", "ok", "GlobalProfile", "nothing to do");
 }

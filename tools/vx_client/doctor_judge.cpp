@@ -91,7 +91,7 @@ class Judge {
         const PresetFacts &preset = slot_.preset;
         if (preset.packageName.empty())
             say("package", Verdict::note, "none looked for, since there is no device id", "loose presets serve",
-                "none, unless the device ought to have a package");
+                "nothing, unless the device ought to have a package");
         else if (!preset.packagePath.empty())
             good("package", preset.packagePath, "the presets come from it");
         else
@@ -193,14 +193,15 @@ class Judge {
         const std::string key = "HKLM\\" + slot_.parameterKey;
         if (!slot_.parametersThere || !slot_.storedDigest)
             say("parameters", Verdict::note, key + " is not filled yet",
-                "the first program that chooses the slot fills it from the preset", "vx get " + name_ + options_ + " does so");
+                "the first program that chooses the slot fills it from the preset",
+                "nothing, or vx get " + name_ + options_ + " to have it filled now");
         else if (!slot_.preset.found)
             say("parameters", Verdict::note, "filled from preset " + *slot_.storedDigest, "that preset is not there any more",
                 "mend the preset first");
         else if (*slot_.storedDigest != slot_.preset.digest)
             say("parameters", Verdict::wrong, "filled from preset " + *slot_.storedDigest,
                 "the preset that is installed is another one",
-                "vx get " + name_ + options_ + " brings them into line and keeps the user's settings");
+                "run vx get " + name_ + options_ + ", which brings them into line and keeps the user's settings");
         else
             good("parameters", key, "consistent with the preset");
     }
@@ -262,7 +263,7 @@ class Judge {
         const ModuleFacts &module = facts_.installation.apoModule;
         if (module.path.empty())
             say("effect module", Verdict::note, "VXAPO64U.dll is not there", "applications reach the effects by the store alone",
-                "none, unless the driver package ought to bring it");
+                "nothing, unless the driver package ought to bring it");
         else if (!module.loads)
             say("effect module", Verdict::note, module.path + " cannot be loaded: " + module.reason,
                 "applications reach the effects by the store alone", "reinstall the driver package");
