@@ -55,7 +55,7 @@ struct OpenEndpoint {
 };
 
 // The control functions' log from a place on that the test sets.
-class ControlLog : public vxcomn::testing::ControlLines {
+class CallLog : public vxcomn::testing::ControlLines {
   public:
     void restart() { from_ = SwitchedLog::texts().size(); }
 
