@@ -24,6 +24,9 @@ class InterruptGuard {
         if (noted_ != 0) throw Failure(ExitStatus::system, "interrupted; nothing was written");
     }
 
+    // For whom a signal is the usual end.
+    bool noted() const { return noted_ != 0; }
+
   private:
     using Handler = void (*)(int);
 

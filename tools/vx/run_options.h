@@ -17,7 +17,7 @@ struct RunOptions {
     CommonOptions common;
     std::string input;
     std::string output;
-    std::string engine = "SampleEngine";
+    std::optional<std::string> engine;  // nothing: the endpoint's if one is followed, else the sample engine
     std::optional<std::string> platform;
     int hostType = 0;
     uint32_t hardware = 0;
@@ -33,10 +33,16 @@ struct RunOptions {
     int recordRate = 0;
     std::string bits;
     std::vector<std::string> plots;
+    std::vector<std::string> levelsPlots;
     std::string levelsCsv;
+    std::string follow;  // an endpoint; empty: none
+    std::string apo = "EFX";
+    bool realTime = false;
     bool digest = false;
     bool force = false;
 };
+
+inline constexpr const char *kUsualEngine = "SampleEngine";
 
 void addRunOptions(CLI::App &verb, RunOptions &options);
 

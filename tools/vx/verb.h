@@ -27,7 +27,6 @@ class Failure : public std::runtime_error {
     ExitStatus status;
 };
 
-void addRunVerb(CLI::App &app, int &exitStatus);
 void addLevelsVerb(CLI::App &app, int &exitStatus);
 void addJoinVerb(CLI::App &app, int &exitStatus);
 
