@@ -8,6 +8,7 @@
 #include <exception>
 #include <iostream>
 
+#include "tools/vx/completion.h"
 #include "tools/vx/system.h"
 #include "tools/vx/verb.h"
 #include "tools/vx_measure/measure_verbs.h"
@@ -52,6 +53,7 @@ int runVx(int argc, char **argv) {
     vx::addMeasureVerbs(app, exitStatus);
     vx::addSignalVerb(app, exitStatus);
     vx::addPresetVerbs(app, exitStatus);
+    vx::addCompleteVerb(app);
     std::vector<std::string> arguments = vx::commandLine(argc, argv);
     std::reverse(arguments.begin(), arguments.end());  // as the parser takes them
     try {
