@@ -17,6 +17,7 @@
 #ifndef VXDSPAPI_H
 #define VXDSPAPI_H
 
+#include "vxcomn/com_types.h"
 #include "vxcomn/library_context.h"
 
 VXCOMN_EXTERN_C_BEGIN
@@ -238,6 +239,23 @@ VXCOMN_API int32_t VXDSPAPI_RTA_CalcSpectrum(const float *power, int32_t fftSize
  */
 VXCOMN_API void VXDSPAPI_RTA_FFTToBands(const float *power, int32_t halfSize, const float *edges, const float *centres,
                                         int32_t tableSize, float *bands, int32_t sampleRate, int32_t integrate);
+
+/*
+ * Tells an audio endpoint's I/O configuration by its properties. Needs no handle.
+ * trace: a logger that gets the steps, or null. properties: the endpoint's property store; only its GetValue is called. Null counts
+ * as a store that holds nothing.
+ * Returns the name ("AnyOutput", "Headphones", ...), which is the library's and lives as long as it; null if the store has no form
+ * factor. [any]
+ */
+VXCOMN_API const VXWCHAR *VXDSPAPI_DevicePropsToIOConfig(struct CTraceFuncCallTarget *trace, IPropertyStore *properties);
+
+/*
+ * Tells an audio endpoint's index by its properties: that of the product's own property, else that of the jack's type.
+ * trace, properties: as above. index: receives the index, -1 (all bits set) if there is none; may be null.
+ * Returns the name of the node type, which is the library's; "KSNODETYPE_UNKNOWN" if the store tells none. [any]
+ */
+VXCOMN_API const VXWCHAR *VXDSPAPI_DevicePropsToEndpointIndex(struct CTraceFuncCallTarget *trace, IPropertyStore *properties,
+                                                              uint32_t *index);
 
 VXCOMN_EXTERN_C_END
 

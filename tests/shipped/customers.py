@@ -27,6 +27,7 @@ WINDOWS_FILES = [
     "bin/vx.exe", "bin/vxreg.exe", "bin/VXCOMN64U.dll", "bin/SampleEngine.dll", "lib/libVXCOMN64U.dll.a", "lib/VXCOMN64U.def",
     "lib/cmake/vxcomn/vxcomn-config.cmake", "lib/pkgconfig/vxcomn.pc", "include/VXDSPAPI.h", "share/doc/vxcomn/README.md",
 ]
+LINES = 40
 PROGRAM = """#include <VXDSPAPI.h>
 #include <stdio.h>
 int main(void) {
@@ -42,7 +43,7 @@ class Customers:
         self.windows = options.windows
         self.options = options
         self.work = work
-        self.source = pathlib.Path(options.source)
+        self.source = pathlib.Path(options.source).resolve()
         self.prefix = work / "moved here"  # with a space, as in real life
         self.ending = ".exe" if self.windows else ""
         # A root of its own for what stands in for the machine; the linker's and Python's usual ways to find things stay shut.
@@ -83,6 +84,12 @@ class Customers:
             for library in (self.prefix / "bin").glob("*.dll"):
                 shutil.copy(library, folder)
 
+    def lengths(self):
+        """An example is to be read at a glance."""
+        for path in sorted((self.source / "examples").iterdir()):
+            if path.suffix in (".c", ".cpp", ".py") and len(path.read_text(encoding="utf-8").splitlines()) > LINES:
+                sys.exit(f"{path}: has more than {LINES} lines")
+
     def find_package(self):
         built = self.work / "examples"
         toolchain = [f"-DCMAKE_TOOLCHAIN_FILE={self.options.toolchain}"] if self.windows else []
@@ -92,7 +99,7 @@ class Customers:
         self.run("cmake", "--build", built)
         self.place(built)
         print("find_package:", self.start(built / f"apo_host{self.ending}").strip())
-        quiet = self.start(built / f"apo_host{self.ending}", "GainEngine", env={} if self.windows else {"LD_LIBRARY_PATH": str(built)})
+        quiet = self.start(built / f"apo_host{self.ending}", "GainEngine")
         if "0.250" not in quiet:
             sys.exit(f"the gain engine at 1 changed the sine: {quiet}")
         print("the C engine:", quiet.strip())
@@ -137,9 +144,10 @@ def main():
     options = parser.parse_args()
     os.makedirs(options.work, exist_ok=True)
     with tempfile.TemporaryDirectory(dir=options.work, prefix="customers-") as work:
-        customers = Customers(options, pathlib.Path(work))
+        customers = Customers(options, pathlib.Path(work).resolve())
         customers.install()
         customers.tools()
+        customers.lengths()
         customers.find_package()
         customers.by_pkg_config()
         if customers.windows:
