@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: MIT
 #include "tools/vx/completion.h"
 
+#include <CLI/CLI.hpp>
 #include <iostream>
 #include <map>
 #include <memory>

@@ -5,10 +5,13 @@
 // only the running machine knows gives them a Completer by the argument's name in the help.
 #pragma once
 
-#include <CLI/CLI.hpp>
 #include <functional>
 #include <string>
 #include <vector>
+
+namespace CLI {
+class App;
+}
 
 namespace vx {
 

@@ -7,12 +7,12 @@
 #include <memory>
 #include <optional>
 
+#include "tools/vx/failure.h"
 #include "tools/vx/interrupt.h"
 #include "tools/vx/layout.h"
 #include "tools/vx/levels_csv.h"
 #include "tools/vx/slot_buffers.h"
 #include "tools/vx/text.h"
-#include "tools/vx/verb.h"
 
 namespace vx {
 
