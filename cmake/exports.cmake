@@ -1,7 +1,16 @@
 # vxcomn_exports(<target> <list>): makes exactly the functions named in the list visible in a shared library. The list has one name
-# a line; lines that begin with # are remarks. The version script and the .def file come from it.
+# a line, followed by "linux" or "windows" if it is that platform's alone; lines that begin with # are remarks. The version script and
+# the .def file come from it.
 function(vxcomn_exports target list)
     file(STRINGS ${list} names REGEX "^[A-Za-z_]")
+    if(WIN32)
+        set(platform windows)
+        list(FILTER names EXCLUDE REGEX " linux$")
+    else()
+        set(platform linux)
+        list(FILTER names EXCLUDE REGEX " windows$")
+    endif()
+    list(TRANSFORM names REPLACE " ${platform}$" "")
     set_property(DIRECTORY APPEND PROPERTY CMAKE_CONFIGURE_DEPENDS ${list})
     if(WIN32)
         get_target_property(module ${target} OUTPUT_NAME)

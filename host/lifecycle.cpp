@@ -8,13 +8,13 @@
 
 #include "VXDSPAPI.h"
 #include "host/engine_events.h"
-#include "host/engine_table.h"
 #include "host/handshake.h"
 #include "host/host_context.h"
 #include "host/isst_module.h"
 #include "host/library_loader.h"
 #include "host/module_name.h"
 #include "platform/module.h"
+#include "preset/engine_table.h"
 
 namespace vxcomn {
 

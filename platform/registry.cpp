@@ -12,7 +12,8 @@ namespace {
 template <class Number>
 RegistryRead readNumber(const RegistryKey &key, WideView name, RegistryType type, Number &number) {
     RegistryValue found;
-    if (key.query(name, found) != status::ok) return RegistryRead::absent;
+    const Status status = key.query(name, found, sizeof number);
+    if (status != status::ok && status != status::moreData) return RegistryRead::absent;
     if ((found.type != type && found.type != RegistryType::binary) || found.data.size() != sizeof number) {
         return RegistryRead::wrongType;
     }
@@ -47,8 +48,9 @@ RegistryRead RegistryKey::readText(WideView name, WideString &value) const {
 
 RegistryRead RegistryKey::readBytes(WideView name, std::vector<uint8_t> &value, size_t limit) const {
     RegistryValue found;
-    if (query(name, found) != status::ok) return RegistryRead::absent;
-    if (found.type != RegistryType::binary || found.data.size() > limit) return RegistryRead::wrongType;
+    const Status status = query(name, found, limit);
+    if (status != status::ok && status != status::moreData) return RegistryRead::absent;
+    if (found.type != RegistryType::binary || status != status::ok) return RegistryRead::wrongType;
     value = std::move(found.data);
     return RegistryRead::value;
 }

@@ -6,6 +6,7 @@
 #pragma once
 
 #include <cstdint>
+#include <functional>
 #include <memory>
 #include <optional>
 #include <span>
@@ -32,6 +33,14 @@ struct RegistryValue {
     std::vector<uint8_t> data;  // as stored; text is UTF-16 little-endian, usually with its end
 };
 
+// A value under its name.
+struct RegistryEntry {
+    WideString name;
+    RegistryValue value;
+};
+
+struct RegistrySubkey;
+
 // What reading one value came to.
 enum class RegistryRead : uint8_t { value, absent, wrongType };
 
@@ -56,8 +65,16 @@ class RegistryKey {
     explicit operator bool() const noexcept;
     void close() noexcept;
 
-    // A value of any type. The empty name is the key's own ("default") value.
-    Status query(WideView name, RegistryValue &value) const;
+    // Reads one value of a key by the key's path, as open and query do; on Linux with one look at the store for a path known from
+    // before.
+    static Status queryAt(RegistryRoot root, WideView path, WideView name, RegistryValue &value, size_t limit = SIZE_MAX);
+    // Opens a key and lists its values (as `entries`), the same way.
+    static Status openWithEntries(RegistryRoot root, WideView path, RegistryAccess access, RegistryKey &key, size_t limit,
+                                  std::vector<RegistryEntry> &found);
+
+    // A value of any type. The empty name is the key's own ("default") value. 234 if it has more than `limit` bytes, and then
+    // `value` has the type and no data, and nothing of it was read.
+    Status query(WideView name, RegistryValue &value, size_t limit = SIZE_MAX) const;
     // Typed reads. A 32-bit value is a REG_DWORD or 4 bytes of REG_BINARY, a 64-bit value a REG_QWORD or 8 bytes of REG_BINARY,
     // text is REG_SZ up to its first end or that of its data, bytes are REG_BINARY of at most `limit` bytes. Outputs are left alone
     // unless the answer is `value`.
@@ -81,11 +98,29 @@ class RegistryKey {
     // The names, in the order of their making on Linux and in the system's order on Windows; compare as sets.
     Status subkeys(std::vector<WideString> &names) const;
     Status values(std::vector<WideString> &names) const;
+    // The values with their names; one of more than `limit` bytes without its data. One look at the store on Linux, and a sight of
+    // one moment there.
+    Status entries(size_t limit, std::vector<RegistryEntry> &found) const;
+    // Opens all keys below this one and reads a value of each (at most `limit` bytes, or it counts as absent). The same.
+    Status openSubkeys(RegistryAccess access, WideView valueName, size_t limit, std::vector<RegistrySubkey> &found) const;
 
   private:
     friend ChangeSignal;
     struct Impl;
     std::unique_ptr<Impl> impl_;
 };
+
+// What openSubkeys finds of a key.
+struct RegistrySubkey {
+    WideString name;
+    RegistryKey key;
+    std::optional<RegistryValue> value;
+};
+
+// Calls `work`, whose registry calls on this thread are one write then on Linux: others see all of it or nothing, and are told
+// once. On Windows each call stands by itself. What went well stays when `work` returns an error. It may be called a second time,
+// as if the first had never been, so it starts from the same place each time; it must not wait for anybody who uses the registry.
+// Returns what `work` returned, or why the whole could not be written.
+Status inOneWrite(const std::function<Status()> &work);
 
 }  // namespace vxcomn

@@ -9,7 +9,7 @@
 //         -> UserProfileName -> EngineConfig -> EngineShortName -> ParamRegKeyName        (chain.cpp)
 //
 // and from there the store is the truth: seeded from the preset (seeding.cpp), overruled by what applications force
-// (forced_selection.cpp), and walked for what is new (update_walk.cpp).
+// (forced_selection.cpp), and walked for what is new (configuration_walk.cpp, parameter_walk.cpp).
 //
 // Control threads, never the block path: a handler may wait for the registry and up to 5 s for the slot's mutex. Locks: the state
 // lock first, then Mutex. The parameter walk, and with it the stamps, the pending changes and the known clients, belongs to one
@@ -17,7 +17,9 @@
 #pragma once
 
 #include <array>
+#include <atomic>
 #include <cstdint>
+#include <cstring>
 #include <map>
 #include <memory>
 #include <vector>
@@ -27,6 +29,7 @@
 #include "preset/change_record.h"
 #include "preset/global_mutex.h"
 #include "preset/instance_id.h"
+#include "preset/package_reader.h"
 #include "preset/parameter_store.h"
 #include "preset/preset_reader.h"
 #include "preset/reactive_property.h"
@@ -50,6 +53,28 @@ struct GuidLess {
 
 // For each running client, component and parameter the stamp that was delivered last.
 using KnownClients = std::map<GUID, std::map<int32_t, std::map<int32_t, uint64_t>>, GuidLess>;
+
+// What the walks have seen. One thread's at a time.
+struct WalkMemory {
+    uint64_t configurationStamp = 0;  // last WriteTime of the configuration key
+    uint64_t parametersStamp = 0;     // last WriteTime of the parameter key
+    std::array<uint64_t, kComponentCount> componentStamps = {};
+    std::array<std::array<uint64_t, kParamCount>, kComponentCount> parameterStamps = {};  // with kStampUnread
+    KnownClients clients;
+
+    // Every parameter counts as new again, those of the clients as well.
+    void forgetParameters() {
+        parametersStamp = 0;
+        componentStamps.fill(0);
+        for (auto &stamps : parameterStamps) stamps.fill(0);
+        for (auto &[client, stamps] : clients) stamps.clear();
+    }
+};
+
+// Stops and deletes the polling thread (update_thread.cpp).
+struct UpdateThreadDeleter {
+    void operator()(CUpdateFromRegistryThread *thread) const noexcept;
+};
 
 // The configuration that UpdateFromRegistry found, and which of it has not been served yet, in this order.
 struct PendingConfiguration {
@@ -116,6 +141,13 @@ struct CAPOPresetFile : CInstanceIDBase, protected vxcomn::PresetOwner {
     vxcomn::StateLock &stateLock() { return StateLock_; }
 
   private:
+    vxcomn::PresetHash &presetHash() override { return PresetHash; }
+    const vxcomn::WideString &engineShortName() const override { return EngineShortName.underLock(); }
+    const ::EngineConfig &engineConfig() const override { return EngineConfig.underLock(); }
+    bool engineLocked() const override { return EngineLocked.get(); }
+    void setEngineShortName(const vxcomn::WideString &name) override { EngineShortName.set(name); }
+    void setEngineConfig(const ::EngineConfig &config) override { EngineConfig.set(config); }
+
     // Ahead of the properties, which hold references to it.
     vxcomn::StateLock StateLock_;
 
@@ -150,4 +182,51 @@ struct CAPOPresetFile : CInstanceIDBase, protected vxcomn::PresetOwner {
     std::array<uint8_t, 4> VersionBytes = {};      // the low byte of each
     vxcomn::PresetHash PresetHash = {};
     Property<bool> EngineLocked{StateLock_};
+
+  private:
+    // The rows of the chain, top to bottom (chain_device.cpp, chain.cpp).
+    void DevicePropertyStore_Changing();
+    void DevicePropertyStore_Changed();
+    void ModuleVersion_Changing();
+    void ModuleVersion_Changed();
+    void DeviceIDAndEndpointIndex_Changing();
+    void DeviceIDAndEndpointIndex_Changed();
+    void APOTypeStr_Changing();
+    void APOTypeStr_Changed();
+    void IOConfigName_Changing();
+    void IOConfigName_Changed();
+    void ContentTypeName_Changing();
+    void ContentTypeName_Changed();
+    void UserProfileName_Changing();
+    void UserProfileName_Changed();
+    void EngineConfig_Changing();
+    void EngineConfig_Changed();
+    void EngineShortName_Changing();
+    void EngineShortName_Changed();
+
+    template <auto changing, auto changed, class Link>
+    void link(Link &property);
+    template <auto changing, auto changed, class Link>
+    void unlink(Link &property);
+    void deriveDeviceIdentity(IPropertyStore *store);
+    void deriveEndpointIndex(IPropertyStore *store);
+    void findPreset();
+    vxcomn::OpenedPreset openPreset(const vxcomn::WideString &path);
+    void savePresetHash(const vxcomn::WideString &keyPath);
+
+    // Sets a property to what the store forces, unless that is nothing or stands already.
+    void adopt(Text &property, const vxcomn::WideString &value, const VXWCHAR *traceName, const VXWCHAR *format);
+    void writeDerivedIOConfig(const vxcomn::WideString &keyPath, vxcomn::WideView name);
+    void restorePresetEngine();
+
+    vxcomn::WideString parameterKeyFor(vxcomn::WideView apoType, vxcomn::WideView ioConfig, vxcomn::WideView contentType) const;
+    bool addKeysOfPackage(const vxcomn::WideString &archive, vxcomn::WideView apoType, std::vector<vxcomn::WideString> &keys);
+    void addKeysOfLooseTree(vxcomn::WideView apoType, std::vector<vxcomn::WideString> &keys);
+
+    bool EngineForced_ = false;  // the engine in force is, or was, an application's choice
+
+    vxcomn::WalkMemory Walk_;
+    // Set on any thread; the parameter walk then forgets its stamps before it begins.
+    std::atomic<bool> StampsLapsed_{false};
+    std::unique_ptr<vxcomn::CUpdateFromRegistryThread, vxcomn::UpdateThreadDeleter> UpdateThread_;
 };

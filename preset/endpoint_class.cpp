@@ -1,15 +1,16 @@
 // SPDX-License-Identifier: MIT
 #include "preset/endpoint_class.h"
 
-#include <span>
+#include <iterator>
+
+#include "platform/guid.h"
 
 namespace vxcomn {
 namespace {
 
-constexpr GuidBytes kAudioEndpoint = {0x1D, 0xA5, 0xD8, 0x03, 0xD4, 0x92, 0x4E, 0xDD,
-                                      0x8C, 0x23, 0xE0, 0xC0, 0xFF, 0xEE, 0x7F, 0x0E};
-constexpr GuidBytes kPrivate = {0x6A, 0x64, 0x14, 0xE7, 0x39, 0xE4, 0x49, 0x1F, 0x8B, 0x8C, 0xC9, 0x02, 0x8A, 0xC7, 0xD6, 0x59};
-constexpr GuidBytes kDriver = {0x3B, 0xA0, 0xCD, 0x54, 0x83, 0x0F, 0x45, 0x51, 0xA6, 0xEB, 0xF3, 0xEA, 0xB6, 0x8E, 0x37, 0x00};
+constexpr GUID kAudioEndpoint = {0x1DA5D803, 0xD492, 0x4EDD, {0x8C, 0x23, 0xE0, 0xC0, 0xFF, 0xEE, 0x7F, 0x0E}};
+constexpr GUID kPrivate = {0x6A6414E7, 0x39E4, 0x491F, {0x8B, 0x8C, 0xC9, 0x02, 0x8A, 0xC7, 0xD6, 0x59}};
+constexpr GUID kDriver = {0x3BA0CD54, 0x830F, 0x4551, {0xA6, 0xEB, 0xF3, 0xEA, 0xB6, 0x8E, 0x37, 0x00}};
 
 constexpr const VXWCHAR *kFormFactors[] = {
     VX_TEXT("Network"), VX_TEXT("AnyOutput"), VX_TEXT("LineOut"),     VX_TEXT("Headphones"), VX_TEXT("Microphone"),
@@ -21,23 +22,23 @@ constexpr uint32_t kHeadphonesFormFactor = 3;
 constexpr const VXWCHAR *kUnknownNode = VX_TEXT("KSNODETYPE_UNKNOWN");
 
 // Node types of the system differ in the low half of their first word alone.
-constexpr GuidBytes nodeType(uint8_t high, uint8_t low) {
-    return {0xDF, 0xF2, high, low, 0xF7, 0x0F, 0x11, 0xD0, 0xB9, 0x17, 0x00, 0xA0, 0xC9, 0x22, 0x31, 0x96};
+constexpr GUID nodeType(uint16_t number) {
+    return {0xDFF20000U | number, 0xF70F, 0x11D0, {0xB9, 0x17, 0x00, 0xA0, 0xC9, 0x22, 0x31, 0x96}};
 }
 
 struct JackSubType {
-    GuidBytes guid;
+    GUID guid;
     const VXWCHAR *name;
 };
 constexpr JackSubType kJackSubTypes[] = {
     // in the order of their indices
-    {nodeType(0x1C, 0xE1), VX_TEXT("KSNODETYPE_SPEAKER")},
-    {nodeType(0x1C, 0xE2), VX_TEXT("KSNODETYPE_HEADPHONES")},
-    {nodeType(0x1F, 0xE3), VX_TEXT("KSNODETYPE_LINE_CONNECTOR")},
-    {nodeType(0x1D, 0xE5), VX_TEXT("KSNODETYPE_ECHO_CANCELING_SPEAKERPHONE")},
-    {nodeType(0x1C, 0xE6), VX_TEXT("KSNODETYPE_COMMUNICATION_SPEAKER")},
-    {nodeType(0x1D, 0xE1), VX_TEXT("KSNODETYPE_HANDSET")},
-    {nodeType(0x1D, 0xE2), VX_TEXT("KSNODETYPE_HEADSET")},
+    {nodeType(0x1CE1), VX_TEXT("KSNODETYPE_SPEAKER")},
+    {nodeType(0x1CE2), VX_TEXT("KSNODETYPE_HEADPHONES")},
+    {nodeType(0x1FE3), VX_TEXT("KSNODETYPE_LINE_CONNECTOR")},
+    {nodeType(0x1DE5), VX_TEXT("KSNODETYPE_ECHO_CANCELING_SPEAKERPHONE")},
+    {nodeType(0x1CE6), VX_TEXT("KSNODETYPE_COMMUNICATION_SPEAKER")},
+    {nodeType(0x1DE1), VX_TEXT("KSNODETYPE_HANDSET")},
+    {nodeType(0x1DE2), VX_TEXT("KSNODETYPE_HEADSET")},
 };
 
 constexpr const VXWCHAR *kPrivateNames[] = {
@@ -51,7 +52,7 @@ bool holds(const PropertyAnswer &answer, uint16_t type) noexcept {
 }
 
 // Whether a switch of the driver is on; `otherwise` where the driver has none. `logged`, if given, is what the line shows instead.
-bool driverSwitch(PropertyReader &properties, const PropertyName &key, bool otherwise, const VXWCHAR *label, const VXWCHAR *keyName,
+bool driverSwitch(PropertyReader &properties, const PROPERTYKEY &key, bool otherwise, const VXWCHAR *label, const VXWCHAR *keyName,
                   const bool *logged, ReadLog *log) {
     const PropertyAnswer answer = properties.read(key);
     if (!holds(answer, kPropertyUi4)) {
@@ -82,17 +83,10 @@ bool driverSaysHeadphones(PropertyReader &properties, ReadLog *log) {
     return false;
 }
 
-int hexadecimalDigit(VXWCHAR c) noexcept {
-    if (c >= '0' && c <= '9') return c - '0';
-    if (c >= 'A' && c <= 'F') return c - 'A' + 10;
-    if (c >= 'a' && c <= 'f') return c - 'a' + 10;
-    return -1;
-}
-
 // The index and name that a jack subtype stands for, or the unknown ones.
 const VXWCHAR *nameOfSubType(const WideString &text, uint32_t &index) {
-    GuidBytes guid;
-    parseGuid(text, guid);
+    GUID guid;
+    parseGuidText(text, guid);  // all zeros, which no row has, for a text that is none
     for (uint32_t i = 0; i < std::size(kJackSubTypes); ++i) {
         if (kJackSubTypes[i].guid != guid) continue;
         index = i;
@@ -103,32 +97,12 @@ const VXWCHAR *nameOfSubType(const WideString &text, uint32_t &index) {
 
 }  // namespace
 
-const PropertyName kFormFactorProperty = {kAudioEndpoint, 0};
-const PropertyName kJackSubTypeProperty = {kAudioEndpoint, 8};
-const PropertyName kEndpointIndexProperty = {kPrivate, 0};
-const PropertyName kDriverHeadphoneModeProperty = {kDriver, 4};
-const PropertyName kDriverRedirectHeadphoneProperty = {kDriver, 1};
-const PropertyName kDriverInternalSpeakerProperty = {kDriver, 6};
-
-bool parseGuid(WideView text, GuidBytes &guid) noexcept {
-    constexpr std::string_view kShape = "{xxxxxxxx-xxxx-xxxx-xxxx-xxxxxxxxxxxx}";
-    guid = {};
-    if (text.size() != kShape.size()) return false;
-    GuidBytes parsed{};
-    size_t digits = 0;
-    for (size_t i = 0; i < text.size(); ++i) {
-        if (kShape[i] != 'x') {
-            if (text[i] != static_cast<VXWCHAR>(kShape[i])) return false;
-            continue;
-        }
-        const int digit = hexadecimalDigit(text[i]);
-        if (digit < 0) return false;
-        parsed[digits / 2] = static_cast<uint8_t>(parsed[digits / 2] << 4 | digit);
-        ++digits;
-    }
-    guid = parsed;
-    return true;
-}
+const PROPERTYKEY kFormFactorProperty = {kAudioEndpoint, 0};
+const PROPERTYKEY kJackSubTypeProperty = {kAudioEndpoint, 8};
+const PROPERTYKEY kEndpointIndexProperty = {kPrivate, 0};
+const PROPERTYKEY kDriverHeadphoneModeProperty = {kDriver, 4};
+const PROPERTYKEY kDriverRedirectHeadphoneProperty = {kDriver, 1};
+const PROPERTYKEY kDriverInternalSpeakerProperty = {kDriver, 6};
 
 const VXWCHAR *devicePropsToIOConfig(PropertyReader &properties, ReadLog *log) {
     const VXWCHAR *name = nullptr;

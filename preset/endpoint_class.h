@@ -4,21 +4,13 @@
 // Pure functions over anything that looks a property up; re-entrant. The texts returned are static.
 #pragma once
 
-#include <array>
 #include <cstdint>
 
 #include "platform/text.h"
 #include "preset/read_log.h"
+#include "vxcomn/com_types.h"
 
 namespace vxcomn {
-
-// A GUID as its sixteen bytes in the order in which its text shows them.
-using GuidBytes = std::array<uint8_t, 16>;
-
-struct PropertyName {
-    GuidBytes format;
-    uint32_t id;
-};
 
 // The variant types that are told apart, numbered as VARTYPE.
 inline constexpr uint16_t kPropertyUi4 = 19;
@@ -34,18 +26,15 @@ struct PropertyAnswer {
 class PropertyReader {
   public:
     virtual ~PropertyReader() = default;
-    virtual PropertyAnswer read(const PropertyName &name) = 0;
+    virtual PropertyAnswer read(const PROPERTYKEY &key) = 0;
 };
 
-extern const PropertyName kFormFactorProperty;               // PKEY_AudioEndpoint_FormFactor
-extern const PropertyName kJackSubTypeProperty;              // PKEY_AudioEndpoint_JackSubType
-extern const PropertyName kEndpointIndexProperty;            // PKEY_VXAPO_EndpointIndex
-extern const PropertyName kDriverHeadphoneModeProperty;      // PKEY_DRV_Headphone_Mode
-extern const PropertyName kDriverRedirectHeadphoneProperty;  // PKEY_DRV_RedirectHeadphone_Enable
-extern const PropertyName kDriverInternalSpeakerProperty;    // PKEY_DRV_Internal_Speaker_Mode
-
-// Reads the usual text {xxxxxxxx-xxxx-xxxx-xxxx-xxxxxxxxxxxx}. False, and `guid` is all zeros, if the text is anything else.
-bool parseGuid(WideView text, GuidBytes &guid) noexcept;
+extern const PROPERTYKEY kFormFactorProperty;               // PKEY_AudioEndpoint_FormFactor
+extern const PROPERTYKEY kJackSubTypeProperty;              // PKEY_AudioEndpoint_JackSubType
+extern const PROPERTYKEY kEndpointIndexProperty;            // PKEY_VXAPO_EndpointIndex
+extern const PROPERTYKEY kDriverHeadphoneModeProperty;      // PKEY_DRV_Headphone_Mode
+extern const PROPERTYKEY kDriverRedirectHeadphoneProperty;  // PKEY_DRV_RedirectHeadphone_Enable
+extern const PROPERTYKEY kDriverInternalSpeakerProperty;    // PKEY_DRV_Internal_Speaker_Mode
 
 // The name of the I/O configuration; null if the form factor cannot be read.
 const VXWCHAR *devicePropsToIOConfig(PropertyReader &properties, ReadLog *log);

@@ -58,6 +58,9 @@ class ReactiveProperty {
         return value_;
     }
 
+    // The value itself, for who holds the lock.
+    const T &underLock() const noexcept { return value_; }
+
     // Fires nothing if the value is the one that stands.
     void set(T value) {
         const std::lock_guard guard(lock_);

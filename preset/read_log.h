@@ -17,6 +17,9 @@ class ReadLog {
   public:
     virtual ~ReadLog() = default;
 
+    // Whether anybody reads the lines. Where nobody does, none is put together; standardError still counts.
+    virtual bool listens() const { return true; }
+
     // A line for the log.
     virtual void line(WideView text) = 0;
 
@@ -54,7 +57,7 @@ inline void append(WideString &line, Hexadecimal number) {
 // Puts a line together from its pieces and logs it.
 template <class... Pieces>
 void say(ReadLog *log, const Pieces &...pieces) {
-    if (log == nullptr) return;
+    if (log == nullptr || !log->listens()) return;
     WideString line;
     (read_log::append(line, pieces), ...);
     log->line(line);

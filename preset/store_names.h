@@ -52,6 +52,9 @@ struct ParameterKeyParts {
 };
 WideString parameterKey(const ParameterKeyParts &parts, uint64_t moduleVersion);
 
+// A number as the names of components and parameters have it.
+WideString decimalName(int32_t number);
+
 // "<ParamId>", or "<ParamId>,<client>" for a value of one client's own.
 WideString parameterValueName(int32_t paramId, WideView client = {});
 

@@ -44,6 +44,9 @@ class ChangeTable {
     void beginWrite() noexcept;
     void endWrite() noexcept;
 
+    // The last number that uniqueCounter (unique_counter.h) gave.
+    std::atomic<uint64_t> &lastNumber() noexcept { return page_->lastNumber; }
+
     // Does for writers that died in the middle what they left undone.
     void finishForTheDead() noexcept;
     // In the child of a fork: the mark is the parent's.
@@ -54,6 +57,7 @@ class ChangeTable {
     struct Page {
         std::atomic<uint32_t> marks[kMarks];  // 0, or the number of the process that is inside a write
         Slot slots[kSlots];
+        std::atomic<uint64_t> lastNumber;
     };
 
     ChangeTable(Descriptor file, Page *page) noexcept : file_(std::move(file)), page_(page) {}

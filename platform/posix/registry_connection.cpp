@@ -2,6 +2,7 @@
 //
 // The connection's half of the store: tables, prepared statements, and the file's identity.
 #include <algorithm>
+#include <atomic>
 #include <cerrno>
 #include <cstring>
 #include <string>
@@ -44,11 +45,18 @@ constexpr const char *kQueries[static_cast<int>(Query::count)] = {
     "INSERT INTO keys (parent, folded, name) VALUES (?1, ?2, ?3)",
     "SELECT name FROM keys WHERE parent = ?1 ORDER BY id",
     "SELECT 1 FROM keys WHERE parent = ?1 LIMIT 1",
-    "SELECT type, data FROM entries WHERE key = ?1 AND folded = ?2",
+    // Of what is longer than allowed only the length is looked at.
+    "SELECT type, CASE WHEN length(data) <= ?3 THEN data END FROM entries WHERE key = ?1 AND folded = ?2",
     "INSERT INTO entries (key, folded, name, type, data) SELECT ?1, ?2, ?3, ?4, ?5 WHERE EXISTS (SELECT 1 FROM keys WHERE id = ?1) "
     "ON CONFLICT (key, folded) DO UPDATE SET type = excluded.type, data = excluded.data",
+    "UPDATE entries SET type = ?4, data = ?5 WHERE key = ?1 AND folded = ?2",
     "DELETE FROM entries WHERE key = ?1 AND folded = ?2",
     "SELECT name FROM entries WHERE key = ?1 ORDER BY id",
+    // A row without a name for a key without values, and none for a key that isn't there.
+    "SELECT entries.name, type, CASE WHEN length(data) <= ?2 THEN data END FROM keys LEFT JOIN entries ON key = keys.id "
+    "WHERE keys.id = ?1 ORDER BY entries.id",
+    "SELECT keys.id, keys.name, type, data FROM keys LEFT JOIN entries ON key = keys.id AND entries.folded = ?2 AND "
+    "length(data) <= ?3 WHERE parent = ?1 ORDER BY keys.id",
     VXCOMN_KEYS_OF_TREE "DELETE FROM entries WHERE key IN tree",
     VXCOMN_KEYS_OF_TREE "DELETE FROM keys WHERE id IN tree AND id <> ?2",
     VXCOMN_KEYS_OF_TREE "SELECT id FROM tree",
@@ -64,6 +72,13 @@ int waitForOthers(void *, int tries) {
     if (tries >= kMostTries) return 0;
     usleep(static_cast<useconds_t>(std::min(kStepMicroseconds * (tries + 1), kLongestMicroseconds)));
     return 1;
+}
+
+std::atomic<uint64_t> statementCount, commitCount;
+
+int countCommit(void *) {
+    commitCount.fetch_add(1, std::memory_order_relaxed);
+    return 0;
 }
 
 void check(int result) {
@@ -98,6 +113,10 @@ bool Statement::next() {
     if (result == SQLITE_ROW) return true;
     if (result == SQLITE_DONE) return false;
     throw StoreError{result};
+}
+
+bool Statement::isNull(int column) const {
+    return sqlite3_column_type(statement_, column) == SQLITE_NULL;
 }
 
 int64_t Statement::number(int column) const {
@@ -136,6 +155,7 @@ void StoreConnection::open() {
     check(sqlite3_open_v2(path_.c_str(), &database_, SQLITE_OPEN_READWRITE | SQLITE_OPEN_CREATE | SQLITE_OPEN_NOMUTEX, nullptr));
     sqlite3_extended_result_codes(database_, 1);
     sqlite3_busy_handler(database_, waitForOthers, nullptr);
+    sqlite3_commit_hook(database_, countCommit, nullptr);
     execute("PRAGMA trusted_schema = OFF; PRAGMA cell_size_check = ON; PRAGMA encoding = 'UTF-16le'");
     execute("PRAGMA journal_mode = WAL; PRAGMA synchronous = NORMAL");
     if (askNumber("PRAGMA user_version") == 0) makeTables();
@@ -183,12 +203,18 @@ void StoreConnection::close() {
 }
 
 Statement StoreConnection::operator()(Query query) {
+    statementCount.fetch_add(1, std::memory_order_relaxed);
     return Statement(statements_[static_cast<int>(query)]);
 }
 
 void StoreConnection::publishChanges(ChangeTable &table) noexcept {
-    for (const Change &change : changes_) table.publish(change.keys, change.kind);
-    changes_.clear();
+    for (int kind = 0; kind < 3; ++kind) {
+        std::vector<int64_t> &keys = changed_[kind];
+        std::sort(keys.begin(), keys.end());
+        keys.erase(std::unique(keys.begin(), keys.end()), keys.end());
+        table.publish(keys, static_cast<ChangeKind>(kind));
+    }
+    forgetChanges();
 }
 
 bool StoreConnection::inPlace() const {
@@ -200,12 +226,18 @@ void StoreConnection::leaveFilesAlone() {
     if (database_ != nullptr) sqlite3_db_config(database_, SQLITE_DBCONFIG_NO_CKPT_ON_CLOSE, 1, nullptr);
 }
 
-StoreTransaction::StoreTransaction(StoreConnection &connection) : connection_(connection) {
-    connection_(Query::begin).run();
+StoreCounts storeCounts() noexcept {
+    return {statementCount.load(), commitCount.load()};
+}
+
+StoreTransaction::StoreTransaction(StoreConnection &connection) : connection_(connection), open_(connection.oneWrite() == nullptr) {
+    if (open_) connection_(Query::begin).run();
 }
 
 StoreTransaction::~StoreTransaction() {
     if (!open_) return;
+    // A key that was made goes with it, and its number to the next one.
+    connection_.keys().clear();
     try {
         connection_(Query::rollback).run();
     } catch (const StoreError &) {
@@ -215,7 +247,7 @@ StoreTransaction::~StoreTransaction() {
 }
 
 void StoreTransaction::commit() {
-    connection_(Query::commit).run();
+    if (open_) connection_(Query::commit).run();
     open_ = false;
 }
 

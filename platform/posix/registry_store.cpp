@@ -36,6 +36,8 @@ constexpr std::array<const char *, 4> kParts = {"", "-wal", "-shm", "-journal"};
 std::mutex storeMutex;
 StoreConnection *connection = nullptr;
 bool forkIsWatched = false;
+// The connection, for a thread that is inside of a OneWrite and so holds the mutex already.
+thread_local StoreConnection *ownConnection = nullptr;
 
 void closeConnection() {
     if (connection != nullptr && !connection->inPlace()) connection->leaveFilesAlone();
@@ -216,16 +218,71 @@ Status attempt(Store &store, bool writes, StoreTask &task, bool &again) {
         again = writes && !current.inPlace();
         return again ? status::badDb : status;
     } catch (const StoreError &error) {
+        // What was noted may hold in spite of the error; telling it once too often does no harm.
+        if (table != nullptr && connection != nullptr) connection->publishChanges(*table);
         again = store.replace(error.result);
         return statusOfSqlite(error.result);
+    } catch (const std::bad_alloc &) {
+        // It may not even have been noted.
+        if (table != nullptr) table->publishEverything();
+        throw;
     }
+}
+
+// A call inside of a OneWrite.
+Status runInside(StoreConnection &store, StoreTask &task) {
+    OneWrite &write = *store.oneWrite();
+    if (write.failure != SQLITE_OK) return statusOfSqlite(write.failure);
+    try {
+        return task(store);
+    } catch (const StoreError &error) {
+        write.failure = error.result;
+    } catch (const std::bad_alloc &) {
+        write.failure = SQLITE_NOMEM;
+    }
+    return statusOfSqlite(write.failure);
+}
+
+// Runs the work as one transaction; false if it has to be done again.
+bool writeOnce(StoreConnection &store, bool trust, const std::function<Status()> &work, Status &status) {
+    struct Inside {
+        explicit Inside(StoreConnection &own, OneWrite &write) : store(own) {
+            store.setOneWrite(&write);
+            ownConnection = &store;
+        }
+        ~Inside() {
+            ownConnection = nullptr;
+            store.setOneWrite(nullptr);
+        }
+        StoreConnection &store;
+    };
+    StoreTransaction transaction(store);
+    OneWrite write = {.trust = trust};
+    {
+        const Inside inside(store, write);
+        status = work();
+    }
+    if (write.failure != SQLITE_OK) throw StoreError{write.failure};
+    if (write.stale) return false;
+    transaction.commit();
+    return true;
 }
 
 }  // namespace
 
+Status inOneWrite(const std::function<Status()> &work) {
+    if (ownConnection != nullptr) return work();
+    return runInStore(true, [&work](StoreConnection &store) {
+        Status status = status::ok;
+        if (!writeOnce(store, true, work, status)) writeOnce(store, false, work, status);
+        return status;
+    });
+}
+
 Status runInStore(bool writes, StoreTask &task) noexcept {
     constexpr int kAttempts = 3;
     try {
+        if (ownConnection != nullptr) return runInside(*ownConnection, task);
         const std::lock_guard lock(storeMutex);
         Store store;
         Status status = store.prepare();

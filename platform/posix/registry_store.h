@@ -23,6 +23,7 @@
 
 #include "platform/posix/change_table.h"
 #include "platform/posix/registry_key.h"
+#include "platform/posix/registry_key_cache.h"
 #include "platform/status.h"
 #include "platform/text.h"
 
@@ -44,8 +45,11 @@ enum class Query : uint8_t {
     hasKeysBelow,
     readValue,
     writeValue,
+    overwriteValue,
     deleteValue,
     listValues,
+    listEntries,
+    listSubkeys,
     deleteValuesOfTree,
     deleteKeysOfTree,
     listTree,
@@ -71,6 +75,7 @@ class Statement {
         }
     }
 
+    bool isNull(int column) const;
     int64_t number(int column) const;
     WideString text(int column) const;
     std::span<const uint8_t> bytes(int column) const;  // until the next call
@@ -78,6 +83,21 @@ class Statement {
   private:
     sqlite3_stmt *statement_;
 };
+
+// The write that the calling thread is inside of (inOneWrite).
+struct OneWrite {
+    // Keys that are known from before are taken as they are, and `stale` tells that one of them proved to be gone. Then all is done
+    // again without trust.
+    bool trust;
+    bool stale = false;
+    int failure = SQLITE_OK;  // what SQLite said first; nothing is tried any more then
+};
+
+// How often the store was asked and how often it was written to, since the process began. For tests and benchmarks.
+struct StoreCounts {
+    uint64_t statements, commits;
+};
+StoreCounts storeCounts() noexcept;
 
 // One open registry.db.
 class StoreConnection {
@@ -95,10 +115,19 @@ class StoreConnection {
     // A random number that this file was given when it was made. Ids of keys count only together with it.
     int64_t identity() const { return identity_; }
 
-    // What a task has committed, so that it is published when the task has returned.
-    void noteChange(const KeyChain &keys, ChangeKind kind) { changes_.push_back({keys, kind}); }
-    void forgetChanges() noexcept { changes_.clear(); }
+    // What a task has written, so that it is told when the task has returned; a key that is noted again and again is told once.
+    void noteChange(std::span<const int64_t> keys, ChangeKind kind) {
+        std::vector<int64_t> &changed = changed_[static_cast<int>(kind)];
+        changed.insert(changed.end(), keys.begin(), keys.end());
+    }
+    void forgetChanges() noexcept {
+        for (std::vector<int64_t> &changed : changed_) changed.clear();
+    }
     void publishChanges(ChangeTable &table) noexcept;
+
+    KeyCache &keys() noexcept { return keys_; }
+    OneWrite *oneWrite() const noexcept { return oneWrite_; }
+    void setOneWrite(OneWrite *write) noexcept { oneWrite_ = write; }
 
     // Whether the file still is the one at the path. One look at the folder.
     bool inPlace() const;
@@ -112,13 +141,10 @@ class StoreConnection {
     int64_t askNumber(const char *sql);
     void close();
 
-    struct Change {
-        KeyChain keys;
-        ChangeKind kind;
-    };
-
     std::string path_;
-    std::vector<Change> changes_;
+    std::vector<int64_t> changed_[3];  // by ChangeKind
+    KeyCache keys_;
+    OneWrite *oneWrite_ = nullptr;
     sqlite3 *database_ = nullptr;
     sqlite3_stmt *statements_[static_cast<int>(Query::count)] = {};
     int64_t identity_ = 0;
@@ -126,7 +152,7 @@ class StoreConnection {
     ino_t file_ = 0;
 };
 
-// A write of several statements: all of them hold, or none.
+// A write of several statements: all of them hold, or none. Inside a OneWrite it is a part of that.
 class StoreTransaction {
   public:
     explicit StoreTransaction(StoreConnection &connection);
@@ -137,7 +163,7 @@ class StoreTransaction {
 
   private:
     StoreConnection &connection_;
-    bool open_ = true;
+    bool open_;
 };
 
 // Runs `task` on the process's connection, again on a fresh file if this one proves to be damaged. With `writes`, the task's writes

@@ -3,6 +3,8 @@
 // The system's own registry.
 #include "platform/registry.h"
 
+#include <algorithm>
+
 #include "platform/security.h"
 #include "platform/windows/registry_key.h"
 
@@ -107,19 +109,23 @@ void RegistryKey::close() noexcept {
     impl_.reset();
 }
 
-Status RegistryKey::query(WideView name, RegistryValue &value) const {
+Status RegistryKey::query(WideView name, RegistryValue &value, size_t limit) const {
     if (!impl_) return status::invalidHandle;
     if (!isName(name)) return status::invalidParameter;
     const WideString ended(name);
-    std::vector<uint8_t> data(256);
+    std::vector<uint8_t> data(std::min<size_t>(limit, 256));
     for (;;) {  // the size may change between two calls
         DWORD type = 0;
         auto size = static_cast<DWORD>(data.size());
         const LSTATUS status = RegQueryValueExW(impl_->key.get(), ended.c_str(), nullptr, &type, data.data(), &size);
         if (status != ERROR_SUCCESS && status != ERROR_MORE_DATA) return static_cast<Status>(status);
+        value.type = static_cast<RegistryType>(type);
+        if (size > limit) {
+            value.data.clear();
+            return status::moreData;
+        }
         data.resize(size);
         if (status == ERROR_MORE_DATA) continue;
-        value.type = static_cast<RegistryType>(type);
         value.data = std::move(data);
         return status::ok;
     }
@@ -169,6 +175,58 @@ Status RegistryKey::values(std::vector<WideString> &names) const {
             return RegEnumValueW(impl_->key.get(), index, buffer, length, nullptr, nullptr, nullptr, nullptr);
         },
         names);
+}
+
+Status RegistryKey::queryAt(RegistryRoot root, WideView path, WideView name, RegistryValue &value, size_t limit) {
+    RegistryKey key;
+    const Status status = open(root, path, RegistryAccess::read, key);
+    return status == status::ok ? key.query(name, value, limit) : status;
+}
+
+Status RegistryKey::openWithEntries(RegistryRoot root, WideView path, RegistryAccess access, RegistryKey &key, size_t limit,
+                                    std::vector<RegistryEntry> &found) {
+    RegistryKey opened;
+    if (const Status status = open(root, path, access, opened); status != status::ok) return status;
+    const Status status = opened.entries(limit, found);
+    if (status == status::ok) key = std::move(opened);
+    return status;
+}
+
+Status RegistryKey::entries(size_t limit, std::vector<RegistryEntry> &found) const {
+    std::vector<WideString> names;
+    if (const Status status = values(names); status != status::ok) return status;
+    std::vector<RegistryEntry> read;
+    for (WideString &name : names) {
+        RegistryValue value;
+        const Status status = query(name, value, limit);
+        if (status == status::fileNotFound) continue;  // deleted meanwhile
+        if (status != status::ok && status != status::moreData) return status;
+        read.push_back({std::move(name), std::move(value)});
+    }
+    found = std::move(read);
+    return status::ok;
+}
+
+Status RegistryKey::openSubkeys(RegistryAccess access, WideView valueName, size_t limit, std::vector<RegistrySubkey> &found) const {
+    std::vector<WideString> names;
+    if (const Status status = subkeys(names); status != status::ok) return status;
+    std::vector<RegistrySubkey> opened;
+    for (WideString &name : names) {
+        RegistrySubkey subkey;
+        const Status status = openBelow(name, access, subkey.key);
+        if (status == status::fileNotFound) continue;  // deleted meanwhile
+        if (status != status::ok) return status;
+        RegistryValue value;
+        if (subkey.key.query(valueName, value, limit) == status::ok) subkey.value = std::move(value);
+        subkey.name = std::move(name);
+        opened.push_back(std::move(subkey));
+    }
+    found = std::move(opened);
+    return status::ok;
+}
+
+Status inOneWrite(const std::function<Status()> &work) {
+    return work();
 }
 
 }  // namespace vxcomn

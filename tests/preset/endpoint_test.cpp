@@ -21,23 +21,23 @@ namespace {
 constexpr int32_t kNotFound = static_cast<int32_t>(0x80070490);
 
 struct Properties final : PropertyReader {
-    PropertyAnswer read(const PropertyName &name) override {
+    PropertyAnswer read(const PROPERTYKEY &name) override {
         ++reads;
         for (const auto &[key, answer] : values) {
-            if (key.format == name.format && key.id == name.id) return answer;
+            if (key.fmtid == name.fmtid && key.pid == name.pid) return answer;
         }
         return {kNotFound, 0, 0, {}};
     }
-    Properties &number(const PropertyName &name, uint32_t value, uint16_t type = kPropertyUi4) {
+    Properties &number(const PROPERTYKEY &name, uint32_t value, uint16_t type = kPropertyUi4) {
         values.push_back({name, {0, type, value, {}}});
         return *this;
     }
-    Properties &text(const PropertyName &name, const char *value) {
+    Properties &text(const PROPERTYKEY &name, const char *value) {
         values.push_back({name, {0, kPropertyText, 0, toWide(value)}});
         return *this;
     }
 
-    std::vector<std::pair<PropertyName, PropertyAnswer>> values;
+    std::vector<std::pair<PROPERTYKEY, PropertyAnswer>> values;
     int reads = 0;
 };
 
