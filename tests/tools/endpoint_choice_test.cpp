@@ -3,7 +3,7 @@
 
 #include <doctest/doctest.h>
 
-#include "tools/vx/verb.h"
+#include "tools/vx/failure.h"
 #include "tools/vx_client/change_stream.h"
 
 using namespace vx::client;

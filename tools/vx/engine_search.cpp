@@ -6,9 +6,9 @@
 #include <filesystem>
 #include <vector>
 
+#include "tools/vx/failure.h"
 #include "tools/vx/system.h"
 #include "tools/vx/text.h"
-#include "tools/vx/verb.h"
 
 namespace vx {
 namespace fs = std::filesystem;

@@ -5,7 +5,7 @@
 
 #include <csignal>
 
-#include "tools/vx/verb.h"
+#include "tools/vx/failure.h"
 
 namespace vx {
 

@@ -8,6 +8,7 @@
 #include <exception>
 #include <iostream>
 
+#include "tools/vx/completion.h"
 #include "tools/vx/run_verb.h"
 #include "tools/vx/system.h"
 #include "tools/vx/verb.h"
@@ -56,6 +57,7 @@ int runVx(int argc, char **argv) {
     vx::addSignalVerb(app, exitStatus);
     vx::addPresetVerbs(app, exitStatus);
     vx::addClientVerbs(app, exitStatus);
+    vx::addCompleteVerb(app);
     std::vector<std::string> arguments = vx::commandLine(argc, argv);
     std::reverse(arguments.begin(), arguments.end());  // as the parser takes them
     try {

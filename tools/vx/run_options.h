@@ -3,13 +3,16 @@
 // What `vx run` was asked for: the command line, checked.
 #pragma once
 
-#include <CLI/CLI.hpp>
 #include <cstdint>
 #include <optional>
 #include <string>
 #include <vector>
 
 #include "tools/vx/console.h"
+
+namespace CLI {
+class App;
+}
 
 namespace vx {
 

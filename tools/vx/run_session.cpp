@@ -9,13 +9,13 @@
 #include <thread>
 
 #include "tools/vx/engine_seat.h"
+#include "tools/vx/failure.h"
 #include "tools/vx/interrupt.h"
 #include "tools/vx/layout.h"
 #include "tools/vx/levels_csv.h"
 #include "tools/vx/levels_plot.h"
 #include "tools/vx/slot_buffers.h"
 #include "tools/vx/text.h"
-#include "tools/vx/verb.h"
 
 namespace vx {
 

@@ -6,8 +6,8 @@
 #include "platform/endpoints.h"
 #include "platform/variant.h"
 #include "preset/endpoint_id.h"
+#include "tools/vx/failure.h"
 #include "tools/vx/text.h"
-#include "tools/vx/verb.h"
 
 namespace vx::client {
 

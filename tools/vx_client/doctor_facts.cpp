@@ -6,9 +6,9 @@
 #include "platform/file_version.h"
 #include "preset/package_discovery.h"
 #include "tools/vx/engine_search.h"
+#include "tools/vx/failure.h"
 #include "tools/vx/system.h"
 #include "tools/vx/text.h"
-#include "tools/vx/verb.h"
 #include "tools/vx_client/doctor.h"
 #include "tools/vx_client/session.h"
 

@@ -1,8 +1,8 @@
 // SPDX-License-Identifier: MIT
 #include "tools/vx_client/raw_value.h"
 
+#include "tools/vx/failure.h"
 #include "tools/vx/text.h"
-#include "tools/vx/verb.h"
 #include "tools/vx_client/user_parameters.h"
 #include "tools/vx_preset/json_at.h"
 #include "tools/vx_preset/value_json.h"

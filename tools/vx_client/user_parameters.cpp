@@ -3,8 +3,8 @@
 
 #include <cmath>
 
+#include "tools/vx/failure.h"
 #include "tools/vx/text.h"
-#include "tools/vx/verb.h"
 
 namespace vx::client {
 
