@@ -89,6 +89,7 @@ class RandomCaller {
     std::vector<std::string> names_;
     std::vector<uint8_t> data_;
     std::set<int32_t> codes_;
+    bool indexFailureSeen_ = false;
     std::vector<std::string> complaints_;
     std::array<uint64_t, 64> foreign_{};  // no handle, although it looks like the inside of one
 };

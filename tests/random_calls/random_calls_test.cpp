@@ -42,5 +42,7 @@ TEST_CASE("random control calls neither crash nor hang, and every error code com
     for (const int32_t code : codes) std::cout << " " << code;
     std::cout << std::endl;
     // A few calls need not meet everything.
-    if (calls >= 20000) CHECK(codes == std::set<int32_t>{-256, -16, -15, -11, -10, -9, -4, -3, -2, 0});
+    std::set<int32_t> all = {-256, -16, -15, -11, -10, -9, -4, -3, -2, 0};
+    if (!FlickeringEndpoint::possible()) all.erase(VXAPOCOMAPI_ERROR_ENDPOINT_INDEX_NOT_FOUND);
+    if (calls >= 200000) CHECK(codes == all);
 }

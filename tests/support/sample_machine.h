@@ -5,9 +5,11 @@
 // the machine has none. What a test stored below the root is taken away at both ends.
 #pragma once
 
+#include <atomic>
 #include <cstdint>
 #include <filesystem>
 #include <string>
+#include <thread>
 #include <vector>
 
 #include "platform/registry.h"
@@ -65,5 +67,21 @@ std::filesystem::path hostPath(const WideString &path);
 // the second call (sample_endpoint.cpp).
 WideString takeSampleEndpoint();
 void giveSampleEndpointBack();
+
+// While this lives an endpoint comes and goes, as one on a bad cable does: a list that names it may be out of date when it is asked
+// for its properties. Nothing happens where endpoints are the machine's.
+class FlickeringEndpoint {
+  public:
+    FlickeringEndpoint();
+    ~FlickeringEndpoint();
+    FlickeringEndpoint(const FlickeringEndpoint &) = delete;
+    FlickeringEndpoint &operator=(const FlickeringEndpoint &) = delete;
+
+    static bool possible() noexcept;
+
+  private:
+    std::atomic<bool> ended_{false};
+    std::thread thread_;
+};
 
 }  // namespace vxcomn::testing

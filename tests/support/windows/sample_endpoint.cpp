@@ -23,4 +23,11 @@ WideString takeSampleEndpoint() {
 
 void giveSampleEndpointBack() {}
 
+FlickeringEndpoint::FlickeringEndpoint() = default;
+FlickeringEndpoint::~FlickeringEndpoint() = default;
+
+bool FlickeringEndpoint::possible() noexcept {
+    return false;
+}
+
 }  // namespace vxcomn::testing
