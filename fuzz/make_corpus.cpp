@@ -128,6 +128,15 @@ void makeKeys(const fs::path &root) {
     for (const char *word : {"{", "}.", "\\", "&SUBSYS_", "&"}) corpus.word(word);
 }
 
+void makeValueNames(const fs::path &root) {
+    Corpus corpus(root, "store_value_name_fuzz");
+    for (const char *number : {"0", "-18", "256", "-64", "2147483647", "-2147483648", "2147483648"}) {
+        corpus.seed(std::string(number));
+        corpus.seed(std::string(number) + ",{CD147EE7-2140-4445-B39A-473D43BE970D}");
+    }
+    for (const char *word : {"-", ",", "{", "}", "0", "CD147EE7-2140-4445-B39A-473D43BE970D"}) corpus.word(word);
+}
+
 }  // namespace
 
 int main(int argc, char **argv) {
@@ -140,5 +149,6 @@ int main(int argc, char **argv) {
     makePackages(root);
     makeMaps(root);
     makeKeys(root);
+    makeValueNames(root);
     return 0;
 }

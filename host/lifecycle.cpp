@@ -8,13 +8,14 @@
 
 #include "VXDSPAPI.h"
 #include "host/engine_events.h"
-#include "host/engine_table.h"
 #include "host/handshake.h"
 #include "host/host_context.h"
 #include "host/isst_module.h"
 #include "host/library_loader.h"
 #include "host/module_name.h"
+#include "host/preset_maintenance.h"
 #include "platform/module.h"
+#include "preset/engine_table.h"
 
 namespace vxcomn {
 
@@ -80,7 +81,9 @@ VXHandle initializeLibrary(const char *EngineName, const char *PlatformName, uin
     context.commandLine = copyText(CommandLine);
     context.hostType = HostType;
     readCommandLine(context, CommandLine);
+    nameEndpoints(context, CommandLine);
     context.apoPresetPath = copyText(APOPresetPath);
+    maintainPreset(context);
     setDefaults(context, RecordSampleRate);
     hostLog(context, handle != nullptr ? VX_TEXT("Done.\n") : VX_TEXT("Failed.\n"));
     return handle;
@@ -106,6 +109,7 @@ int32_t freeLibrary(VXHandle handle) {
         disposeLeftovers(context);
         if (context.engineFree != nullptr) context.engineFree(handle);
         freeText(context.commandLine);
+        endPresetMaintenance(context);
         freeText(context.apoPresetPath);
         freeText(context.inputEndpointId);
         freeText(context.inputEndpointName);

@@ -8,6 +8,7 @@
 #include "host/handshake.h"
 #include "host/host_context.h"
 #include "host/isst_module.h"
+#include "host/preset_maintenance.h"
 #include "measure/byte_cursors.h"
 
 namespace vxcomn {
@@ -32,6 +33,7 @@ struct Parameter {
     uint32_t channel;
     uint8_t *data;
     uint32_t dataSize;
+    int32_t transient;  // only the preset mirror asks
 };
 
 ByteReader readerOf(const Parameter &parameter) {
@@ -175,6 +177,9 @@ uint32_t routeParameter(VXHandle handle, const Parameter &parameter) {
                 parameter.componentId, parameter.paramId, static_cast<int32_t>(parameter.channel),
                 parameter.data == nullptr ? uint8_t{0} : parameter.data[0], static_cast<int32_t>(parameter.dataSize));
     }
+    // Ahead of every other test: the store also gets what comes while no engine is ready.
+    mirrorParameter(context, parameter.componentId, parameter.paramId, parameter.channel, parameter.data, parameter.dataSize,
+                    parameter.transient);
     if (context.initialised == 0) return 0;
     switch (parameter.paramId) {
         case kComponentOnISST:
@@ -209,9 +214,8 @@ uint32_t VXDSPAPI_SetParameter(VXHandle handle, int32_t componentId, int32_t par
 
 uint32_t VXDSPAPI_SetParameterEx(VXHandle handle, int32_t componentId, int32_t paramId, uint32_t channel, uint8_t *data,
                                  uint32_t dataSize, int32_t transient) {
-    static_cast<void>(transient);  // only the preset mirror asks
     try {
-        return vxcomn::routeParameter(handle, {componentId, paramId, channel, data, dataSize});
+        return vxcomn::routeParameter(handle, {componentId, paramId, channel, data, dataSize, transient});
     } catch (...) {
         return 0;
     }

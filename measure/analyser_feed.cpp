@@ -19,7 +19,7 @@ void RealTimeAnalyser::create(int rate) {
     *this = RealTimeAnalyser{};
     sampleRate = rate;
     if (rate < 1) return;
-    ring = static_cast<float *>(std::calloc(static_cast<size_t>(rate), sizeof(float)));
+    ring = allocateFloats(static_cast<size_t>(rate));
     writeIndex = static_cast<int32_t *>(std::malloc(sizeof(int32_t)));
     readIndex = static_cast<int32_t *>(std::malloc(sizeof(int32_t)));
     if (ring == nullptr || writeIndex == nullptr || readIndex == nullptr) {
@@ -33,7 +33,7 @@ void RealTimeAnalyser::create(int rate) {
 }
 
 void RealTimeAnalyser::dispose() {
-    std::free(ring);
+    freeFloats(ring);
     std::free(writeIndex);
     std::free(readIndex);
     freeFloats(window);

@@ -7,7 +7,7 @@
 
 namespace vxcomn {
 
-// `count` zeros, or null if memory is out.
+// `count` zeros, all in memory already, or null if memory is out.
 float *allocateFloats(size_t count) noexcept;
 
 // Null is allowed.

@@ -101,7 +101,8 @@ class RegistryKey {
     // The values with their names; one of more than `limit` bytes without its data. One look at the store on Linux, and a sight of
     // one moment there.
     Status entries(size_t limit, std::vector<RegistryEntry> &found) const;
-    // Opens all keys below this one and reads a value of each (at most `limit` bytes, or it counts as absent). The same.
+    // Opens all keys below this one and reads a value of each (at most `limit` bytes, or it counts as absent). The same. One that
+    // the caller may not open comes without its key.
     Status openSubkeys(RegistryAccess access, WideView valueName, size_t limit, std::vector<RegistrySubkey> &found) const;
 
   private:

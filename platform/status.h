@@ -17,6 +17,7 @@ inline constexpr Status pathNotFound = 3;
 inline constexpr Status accessDenied = 5;
 inline constexpr Status invalidHandle = 6;
 inline constexpr Status notEnoughMemory = 8;
+inline constexpr Status invalidData = 13;
 inline constexpr Status genFailure = 31;
 inline constexpr Status sharingViolation = 32;
 inline constexpr Status notSupported = 50;

@@ -116,6 +116,8 @@ struct CAPOPresetFile : CInstanceIDBase, protected vxcomn::PresetOwner {
     bool ResetParameter(int32_t ComponentId, int32_t ParamId, bool globally);
     // Resets if the store's hash is not the preset's; whether it had to.
     bool EnsureParametersAreInRegistry();
+    // What that calls in place of ResetParameters, for an owner with settings to keep; under the state lock and Mutex.
+    vxcomn::PropertyHandler Reseeding;
     bool GetPresetHash(vxcomn::PresetHash &words);
     // The parameter keys of every configuration and content that exists for a slot; duplicates are kept.
     void GetAllParamRegKeysForAPOType(vxcomn::WideView apoType, std::vector<vxcomn::WideString> &keys);

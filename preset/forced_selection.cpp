@@ -109,11 +109,9 @@ void CAPOPresetFile::writeDerivedIOConfig(const WideString &keyPath, WideView na
 
 // What is not forced keeps standing. A force that has gone gives the engine back to the preset.
 void CAPOPresetFile::UpdateEngine() {
-    const RegistryKey configuration = openConfiguration(APOTypeRegKeyName.get());
-    if (APOTypeRegKeyName.get().empty()) return;
     WideString name;
     ::EngineConfig config = {};
-    if (configuration) {
+    if (const RegistryKey configuration = openConfiguration(APOTypeRegKeyName.get())) {
         name = readForcedEngineName(configuration);
         config = readForcedEngineConfig(configuration);
     }

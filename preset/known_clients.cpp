@@ -26,7 +26,8 @@ Status disposeOfMark(const WideString &path, const WideString &name) {
 }  // namespace
 
 void ParameterWalk::lookAtClients(const WideString &configurationKey) {
-    const WideString path = configurationKey + VX_TEXT("\\") + store_name::clients;
+    clientsKey_ = configurationKey + VX_TEXT("\\") + store_name::clients;
+    const WideString &path = clientsKey_;
     RegistryKey key;
     std::vector<RegistryEntry> marks;
     if (RegistryKey::openWithEntries(RegistryRoot::localMachine, path, RegistryAccess::read, key, 0, marks) != status::ok) {
@@ -53,6 +54,18 @@ void ParameterWalk::lookAtClients(const WideString &configurationKey) {
         }
     }
     for (const GUID &client : running) memory_.clients.try_emplace(client);
+}
+
+// A client marks itself before it writes, so one that writes behind the look at the marks has its mark by now.
+bool ParameterWalk::hasJoined(const GUID &client) {
+    const WideString id = guidText(client);
+    RegistryValue mark;
+    if (clientsKey_.empty() || !NamedMutex::exists(VX_TEXT("Global\\") + id) ||
+        RegistryKey::queryAt(RegistryRoot::localMachine, clientsKey_, id, mark, 0) == status::fileNotFound) {
+        return false;
+    }
+    memory_.clients.try_emplace(client);
+    return true;
 }
 
 // What the client said for itself lapses, so all components are looked into anew.

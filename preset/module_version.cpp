@@ -24,13 +24,13 @@ WideView extensionOf(WideView path) noexcept {
     return at == WideView::npos || path[at] != VXWCHAR{'.'} ? WideView() : path.substr(at);
 }
 
-uint64_t versionOfThisModule(const CTraceFuncCallTarget &trace, uint64_t *out) {
+uint64_t versionOfThisModule(const CTraceFuncCallTarget &trace, uint64_t *out, VersionLog wanted) {
     const WideString path = thisModulePath();
     if (path.empty()) {
         trace.log(VX_TEXT("Failed to retrieve this module version, GetModuleFileName failed with error code %i.\n"), lastError());
         return 0;
     }
-    trace.log(VX_TEXT("This module path = %s.\n"), path);
+    if (wanted == VersionLog::all) trace.log(VX_TEXT("This module path = %s.\n"), path);
     const WideView extension = extensionOf(path);
     if (!equalIgnoringCase(extension, moduleExtension())) {
         trace.log(VX_TEXT("Invalid module extension '%s'.\n"), WideString(extension));
@@ -38,16 +38,17 @@ uint64_t versionOfThisModule(const CTraceFuncCallTarget &trace, uint64_t *out) {
     }
     const std::optional<uint64_t> version = fileVersion(path);
     if (!version) return 0;
-    logVersion(trace, VX_TEXT("This module version = { %i, %i, %i, %i }.\n"), *version);
+    if (wanted == VersionLog::all) logVersion(trace, VX_TEXT("This module version = { %i, %i, %i, %i }.\n"), *version);
     if (out != nullptr) *out = *version;
     return *version;
 }
 
 }  // namespace
 
-uint64_t GetAPOModuleVersion(const CTraceFuncCallTarget &trace, const SystemFacts &facts, uint64_t *thisModuleVersion) {
-    const TraceScope scope(trace.TraceTarget, VX_TEXT("GetAPOModuleVersion"));
-    uint64_t version = versionOfThisModule(trace, thisModuleVersion);
+uint64_t GetAPOModuleVersion(const CTraceFuncCallTarget &trace, const SystemFacts &facts, uint64_t *thisModuleVersion,
+                             VersionLog wanted) {
+    const TraceScope scope(wanted == VersionLog::all ? trace.TraceTarget : nullptr, VX_TEXT("GetAPOModuleVersion"));
+    uint64_t version = versionOfThisModule(trace, thisModuleVersion, wanted);
     WideString installed = packageFolder(facts);
     installed += facts.nativeArchitecture == kArchitectureX86 ? kInstalledModule32 : kInstalledModule64;
     Status why = status::ok;
@@ -58,7 +59,7 @@ uint64_t GetAPOModuleVersion(const CTraceFuncCallTarget &trace, const SystemFact
     } else {
         trace.log(VX_TEXT("Couldn't access '%s' module file, error code = %i.\n"), installed, why);
     }
-    logVersion(trace, VX_TEXT("Returning APO module version = { %i, %i, %i, %i }.\n"), version);
+    if (wanted == VersionLog::all) logVersion(trace, VX_TEXT("Returning APO module version = { %i, %i, %i, %i }.\n"), version);
     return version;
 }
 

@@ -16,7 +16,11 @@ constexpr int32_t versionPart(uint64_t version, int part) noexcept {
     return static_cast<int32_t>(version >> (48 - 16 * part) & 0xFFFF);
 }
 
+// What goes into the log: everything, or only why a file tells no version.
+enum class VersionLog : uint8_t { all, problems };
+
 // Packed, 0 if neither file tells one. `thisModuleVersion` (may be null) receives this library's own if it bears one.
-uint64_t GetAPOModuleVersion(const CTraceFuncCallTarget &trace, const SystemFacts &facts, uint64_t *thisModuleVersion);
+uint64_t GetAPOModuleVersion(const CTraceFuncCallTarget &trace, const SystemFacts &facts, uint64_t *thisModuleVersion,
+                             VersionLog wanted = VersionLog::all);
 
 }  // namespace vxcomn

@@ -31,7 +31,7 @@ struct PresetLocation {
 struct OpenedPreset {
     std::unique_ptr<ByteSource> source;  // null: there is no preset
     std::unique_ptr<ByteCursor> stream;  // stands on the image's first byte
-    std::string entryName;               // the last entry name read from a package: the chosen one's, if there is one
+    std::string entryName;               // of the last header read from a package: the chosen one's, if there is one
     uint32_t size = 0;                   // of the image
     int32_t packageIndex = -1;           // of the package chosen by the subsystem id; 0 for a loose file
 

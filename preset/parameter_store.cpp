@@ -134,6 +134,7 @@ bool WriteParameter(const CTraceFuncCallTarget *trace, WideView parameterKey, in
                     std::span<const uint8_t> data, const ParameterSource &source, bool isTransient, uint64_t *stamp) {
     if (parameterKey.empty()) {
         if (trace != nullptr) trace->log(VX_TEXT("Empty param reg key received\n"));
+        setLastError(status::invalidParameter);
         return false;
     }
     // All that needs memory is made ahead of the write, so that who is told of none finds nothing written.
@@ -160,6 +161,7 @@ bool WriteParameter(const CTraceFuncCallTarget *trace, WideView parameterKey, in
     logFailure(trace, steps.time, VX_TEXT("Failed to create 'Time' reg value with error code %i\n"));
     logFailure(trace, steps.componentStamp, VX_TEXT("Failed to create 'WriteTime' reg value with error code %i\n"));
     if (stamp != nullptr && written != 0) *stamp = written;
+    if (whole != status::ok) setLastError(whole);
     return whole == status::ok;
 }
 

@@ -50,8 +50,8 @@ struct ParameterSource {
 };
 
 // Writes one parameter below a parameter key in the order that lets a watcher trust WriteTime: data, source, time, the component's
-// stamp, the key's. The channel is dropped. `stamp` (may be null) receives the stamp. False if the key, the component or the last
-// write failed.
+// stamp, the key's. The channel is dropped. `stamp` (may be null) receives the stamp. False, with the
+// thread's last error (platform/last_error.h), if the key, the component or the last write failed.
 bool WriteParameter(const CTraceFuncCallTarget *trace, WideView parameterKey, int32_t componentId, int32_t paramId, int32_t channel,
                     std::span<const uint8_t> data, const ParameterSource &source, bool isTransient, uint64_t *stamp);
 

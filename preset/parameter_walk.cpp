@@ -140,8 +140,7 @@ void ParameterWalk::walkSharedValue(const WalkedComponent &component, const Regi
 
 void ParameterWalk::walkPrivateValue(const WalkedComponent &component, const RegistryEntry &time, uint64_t stamp, Marked &marked) {
     const StoreValueName name = parseValueName(time.name);
-    const auto client = name.client ? memory_.clients.find(*name.client) : memory_.clients.end();
-    const bool isKnown = client != memory_.clients.end();
+    const bool isKnown = name.client && (memory_.clients.contains(*name.client) || hasJoined(*name.client));
     if (!isKnown) deleteParameterValue(parameterKey_, component.key.name, time.name);
     const int32_t paramId = name.paramId.value_or(kNoNumber);
     if (paramId < kLowestParam || paramId > kHighestParam) {
@@ -153,7 +152,7 @@ void ParameterWalk::walkPrivateValue(const WalkedComponent &component, const Reg
         mark(component.id, paramId, 0, marked);
         return;
     }
-    uint64_t &seen = client->second[component.id][paramId];
+    uint64_t &seen = memory_.clients[*name.client][component.id][paramId];
     if (!isNew(seen, stamp)) return;
     Reading reading = read(component.key.key, time.name, stamp);
     reading.source = *name.client;

@@ -44,6 +44,8 @@ class ParameterWalk {
     };
 
     void forgetClient(KnownClients::iterator &client);
+    // Whether a client has come since its slot's clients were looked at; it is known then.
+    bool hasJoined(const GUID &client);
     bool keyStamp(uint64_t &stamp) const;
     void walkComponents();
     void walkComponent(RegistrySubkey &key);
@@ -64,7 +66,7 @@ class ParameterWalk {
     WalkMemory &memory_;
     PendingChanges &changes_;
     const bool force_;
-    WideString parameterKey_;
+    WideString clientsKey_, parameterKey_;
 };
 
 }  // namespace vxcomn

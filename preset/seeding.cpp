@@ -3,6 +3,8 @@
 // Presets and the parameter store: finding the preset of the present selection, loading it, and copying it into the store, which is
 // the truth from then on. The store's hash says which preset seeded it.
 #include <algorithm>
+#include <mutex>
+#include <optional>
 
 #include "platform/last_error.h"
 #include "platform/security.h"
@@ -92,7 +94,9 @@ void CAPOPresetFile::findPreset() {
     EngineShortName.set({});
 }
 
+// Under the state lock, since the hash and the engine are the object's own.
 bool CAPOPresetFile::LoadPreset(uint32_t flags, PresetParameters *parameters) {
+    const std::lock_guard guard(StateLock_);
     const WideString path = PresetFilePath.get();
     WideString arguments = VX_TEXT("PresetFilePath = ") + path + VX_TEXT(", LoadPresetFlags = 0x");
     appendHexadecimal(arguments, flags);
@@ -109,6 +113,8 @@ bool CAPOPresetFile::LoadPreset(uint32_t flags, PresetParameters *parameters) {
 
 bool CAPOPresetFile::ResetParameters(bool wholeTree, bool keepPower) {
     const TraceScope scope(TraceTarget, VX_TEXT("ResetParameters"));
+    // Properties are read below, and whoever holds the state lock may be waiting for the mutex.
+    const std::lock_guard guard(StateLock_);
     const GlobalMutexLock lock(Mutex);
     const WideString key = ParamRegKeyName.get();
     if (key.empty()) return true;
@@ -148,10 +154,15 @@ bool CAPOPresetFile::ResetParameter(int32_t ComponentId, int32_t ParamId, bool) 
 }
 
 bool CAPOPresetFile::EnsureParametersAreInRegistry() {
+    const std::lock_guard guard(StateLock_);
     const GlobalMutexLock lock(Mutex);
     logHash(*this, VX_TEXT("Preset file hash = %X%X%X%X%X%X%X%X\n"), PresetHash);
     if (vxcomn::PresetHash stored = {}; GetPresetHash(stored) && stored == PresetHash) return false;
-    ResetParameters(false, false);
+    if (Reseeding.call != nullptr) {
+        Reseeding.call(Reseeding.object);
+    } else {
+        ResetParameters(false, false);
+    }
     return true;
 }
 
@@ -179,9 +190,22 @@ bool CAPOPresetFile::GetParameter(int32_t ComponentId, int32_t ParamId, int32_t 
     const WideString key = ParamRegKeyName.get();
     if (key.empty()) return false;
     const uint32_t room = size;
-    Status status = ReadParameterValue(key, ComponentId, ParamId, data, size, source, stamp);
+    const auto read = [&] {
+        size = room;
+        return ReadParameterValue(key, ComponentId, ParamId, data, size, source, stamp);
+    };
     // A value that does not fit is there: seeding would cost the user all others and change nothing.
-    if (status != status::ok && status != status::moreData) {
+    const auto isThere = [](Status found) { return found == status::ok || found == status::moreData; };
+    Status status = read();
+    std::unique_lock<StateLock> state(StateLock_, std::defer_lock);
+    std::optional<GlobalMutexLock> slot;
+    if (!isThere(status)) {
+        state.lock();
+        slot.emplace(Mutex);
+        // Whoever had the mutex may have been filling the store.
+        status = read();
+    }
+    if (!isThere(status)) {
         WideString arguments = VX_TEXT("ComponentId = ");
         appendValue(arguments, ComponentId);
         arguments += VX_TEXT(", ParamId = ");
@@ -192,8 +216,7 @@ bool CAPOPresetFile::GetParameter(int32_t ComponentId, int32_t ParamId, int32_t 
         log(VX_TEXT("Looks like preset hasn't been loaded in the registry, load it.\n"));
         setLastError(status::ok);
         ResetParameters(false, false);
-        size = room;
-        status = ReadParameterValue(key, ComponentId, ParamId, data, size, source, stamp);
+        status = read();
     }
     if (status != status::ok) setLastError(status);
     return status == status::ok;

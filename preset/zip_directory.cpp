@@ -59,6 +59,7 @@ const char *ReadZipEndRecord(ByteSource &file, ZipEndRecord &record) {
 }
 
 const char *readZipHeader(ByteCursor &stream, size_t nameLimit, ZipHeader &header) {
+    header.name = {};  // the one before may lie in a window that the next take gives up
     const uint8_t *const bytes = stream.take(kCentralBytes);
     if (bytes == nullptr) return "Couldn't read enough bytes for JZGlobalFileHeader.";
     if (wordAt(bytes) != kCentralSignature) return "Zip file signature is not valid.";

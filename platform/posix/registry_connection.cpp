@@ -150,8 +150,11 @@ StoreConnection::~StoreConnection() {
 }
 
 void StoreConnection::open() {
-    // SQLite gives the journals the permissions of the file.
-    if (!openForAll(path_)) throw StoreError{SQLITE_CANTOPEN};
+    // SQLite gives the journals the permissions of the file. One that is there is not opened here: closing it again would let go of
+    // the locks that this process has on it through another copy of this code, a program's own beside the library's.
+    struct stat present;
+    const bool isThere = lstat(path_.c_str(), &present) == 0 && S_ISREG(present.st_mode);
+    if (!isThere && !openForAll(path_)) throw StoreError{SQLITE_CANTOPEN};
     check(sqlite3_open_v2(path_.c_str(), &database_, SQLITE_OPEN_READWRITE | SQLITE_OPEN_CREATE | SQLITE_OPEN_NOMUTEX, nullptr));
     sqlite3_extended_result_codes(database_, 1);
     sqlite3_busy_handler(database_, waitForOthers, nullptr);

@@ -215,9 +215,8 @@ Status RegistryKey::openSubkeys(RegistryAccess access, WideView valueName, size_
         RegistrySubkey subkey;
         const Status status = openBelow(name, access, subkey.key);
         if (status == status::fileNotFound) continue;  // deleted meanwhile
-        if (status != status::ok) return status;
         RegistryValue value;
-        if (subkey.key.query(valueName, value, limit) == status::ok) subkey.value = std::move(value);
+        if (status == status::ok && subkey.key.query(valueName, value, limit) == status::ok) subkey.value = std::move(value);
         subkey.name = std::move(name);
         opened.push_back(std::move(subkey));
     }

@@ -3,7 +3,7 @@
 
 #include <doctest/doctest.h>
 
-#include "host/engine_table.h"
+#include "preset/engine_table.h"
 
 using namespace vxcomn;
 

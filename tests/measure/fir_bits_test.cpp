@@ -5,6 +5,7 @@
 
 #include <bit>
 #include <cstdint>
+#include <iterator>
 #include <limits>
 #include <random>
 #include <vector>
@@ -149,6 +150,33 @@ TEST_CASE("zeros keep their signs as in the plain form") {
                     judge.overlap[i] = filter.overlap[i] = random() % 2 != 0 ? -0.0f : 0.0f;
                 }
                 CHECK_EQ(firstDifference(filter, judge, sparse(1200), {512, 17, 512, 1, 158}), -1);
+            }
+        }
+    });
+}
+
+TEST_CASE("a lone negative zero keeps its sign as in the plain form") {
+    withEachInstructionSet([] {
+        // Short blocks of small numbers, so that sums cancel and what is left of a zero is its sign.
+        constexpr float kValues[] = {0.0f, -0.0f, -0.0f, 1.0f, -1.0f, 0.5f, -1.5f};
+        Random random(7);
+        const auto draw = [&](int length) {
+            std::vector<float> values(static_cast<size_t>(length));
+            for (float &value : values) value = kValues[random() % std::size(kValues)];
+            return values;
+        };
+        for (const int count : {3, 5, 8, 9, 13, 16, 17, 33}) {
+            for (int trial = 0; trial < 4000; ++trial) {
+                CAPTURE(count);
+                CAPTURE(trial);
+                const std::vector<float> taps = draw(count);
+                Filter filter(taps);
+                plain::Fir judge = judgeOf(taps);
+                for (size_t i = 0; i < judge.overlap.size(); ++i) {
+                    judge.overlap[i] = filter.overlap[i] = random() % 2 != 0 ? -0.0f : 0.0f;
+                }
+                const int length = 1 + static_cast<int>(random() % 12);
+                REQUIRE_EQ(firstDifference(filter, judge, draw(length), {length}), -1);
             }
         }
     });

@@ -218,6 +218,14 @@ TEST_CASE("a name length of 65,535 is refused, and one beyond the file is cut of
           "Failed to read zip entry #3, reason: 'Failed to read zip file name.'.\n");
 }
 
+TEST_CASE("a header that cannot be read leaves no name of the entry before it") {
+    Bytes archive = twoModels().archive();
+    archive[headerOf(archive, 3)] ^= 1;
+    OpenRun broken(archive, VX_TEXT("SUBSYS_00000009"), VX_TEXT("no such entry"));
+    CHECK(broken.log.last() == "Failed to read zip entry #3, reason: 'Zip file signature is not valid.'.\n");
+    CHECK(broken.opened.entryName.empty());
+}
+
 TEST_CASE("a long entry name is read up to 2,047 bytes and the walk goes on behind it") {
     Package package;
     package.add("7/" + std::string(5000, 'x')).add("7/0/EFX/Output/AnyContent/Preset.bin");

@@ -284,6 +284,26 @@ TEST_CASE_FIXTURE(Walk, "private values of somebody who was never known are remo
     CHECK_FALSE(holds("0", "Data", "1," + utf8(id)));
 }
 
+TEST_CASE_FIXTURE(Walk, "a client that comes in the middle of a walk keeps what it writes, and it is delivered") {
+    host.walk();
+    WalkMemory memory;
+    PendingChanges changes;
+    ParameterWalk walk(host, memory, changes, false);
+    write(0, 2, {2});
+    const test::SlotClient early(*this);
+    walk.lookAtClients(configuration);
+    const test::SlotClient late(*this);
+    writeFrom(late.source(), 0, 1, {1}, true);
+    walk.lookAtParameters(parameters, nullptr);
+    CHECK(test::deliveredIn(changes) == List{{0, 1, {1}, true}, {0, 2, {2}}});
+    CHECK(holds("0", "Data", "1," + utf8(late.InstanceId)));
+    // Who lives without a mark is no client of the slot.
+    const CInstanceIDBase stranger;
+    writeFrom({stranger.InstanceGuid, stranger.InstanceId}, 0, 1, {1}, true);
+    walk.lookAtParameters(parameters, nullptr);
+    CHECK_FALSE(holds("0", "Data", "1," + utf8(stranger.InstanceId)));
+}
+
 TEST_CASE_FIXTURE(Walk, "behind a deleted mark one is passed over in this walk and met in the next") {
     std::vector<std::string> dead;
     for (int i = 0; i < 4; ++i) {

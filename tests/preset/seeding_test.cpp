@@ -1,10 +1,7 @@
 // SPDX-License-Identifier: MIT
 //
 // The preset seeds the store, and the store tells which preset did.
-#include <cstring>
-
-#include "platform/last_error.h"
-#include "tests/preset/graph_fixture.h"
+#include "tests/preset/seeded_fixture.h"
 
 using namespace vxcomn;
 using namespace vxcomn::testing;
@@ -12,36 +9,6 @@ using namespace vxcomn::testing;
 namespace {
 
 using Texts = std::vector<std::string>;
-
-// Power on, bypass, a few values, and the bounds that stay in the preset.
-PresetDocument seedDocument(uint8_t mark = 1) {
-    PresetDocument document = longDocument();
-    document.blocks = {{-1, -2, -2, {{0, 0, 128, 63}}},
-                       {-1, -18, -18, {{1}}},
-                       {0, -21, -20, {{0, 0, 64, 65}, {0, 0, 64, 193}}},
-                       {5, -21, -21, {{9}}},
-                       {5, 115, 116, {{mark}, {}}}};
-    return document;
-}
-
-struct Seeded : Graph {
-    Seeded() {
-        putPreset(seedDocument());
-        open();
-        REQUIRE_FALSE(host->ParamRegKeyName.get().empty());
-    }
-    RegistryKey parameters() const { return key(host->ParamRegKeyName.get()); }
-    Bytes storedHash() const {
-        std::vector<uint8_t> bytes;
-        parameters().readBytes(store_name::presetHash, bytes, 32);
-        return bytes;
-    }
-    Bytes hashBytes() const {
-        Bytes bytes(32);
-        std::memcpy(bytes.data(), host->PresetHash.data(), 32);
-        return bytes;
-    }
-};
 
 }  // namespace
 
@@ -222,52 +189,6 @@ TEST_CASE_FIXTURE(Seeded, "a client that has another preset of the same name res
     Host client;
     client.open(&store, "EFX");
     CHECK(value(5, 115) == Bytes{2});
-}
-
-TEST_CASE_FIXTURE(Seeded, "a stored parameter is read, and nothing is reset") {
-    write(5, 115, {7, 8});
-    uint8_t data[4] = {};
-    uint32_t size = sizeof data;
-    CHECK(host->GetParameter(5, 115, -1, data, size, nullptr, nullptr));
-    CHECK(size == 2);
-    CHECK(data[1] == 8);
-}
-
-TEST_CASE_FIXTURE(Seeded, "a parameter that is not there is seeded first and then read") {
-    DeleteRegKeyTree(host->ParamRegKeyName.get(), false);
-    uint8_t data[4] = {};
-    uint32_t size = sizeof data;
-    const GraphLog log;
-    CHECK(host->GetParameter(5, 115, -1, data, size, nullptr, nullptr));
-    CHECK(size == 1);
-    CHECK(data[0] == 1);
-    CHECK(log.inOrder({"{ GetParameter(ComponentId = 5, ParamId = 115, Channel = -1)",
-                       "Looks like preset hasn't been loaded in the registry, load it.", "{ ResetParameters()",
-                       "} GetParameter(ComponentId = 5, ParamId = 115, Channel = -1)"}));
-}
-
-TEST_CASE_FIXTURE(Seeded, "a parameter that neither store nor preset has is no value, with the registry's error") {
-    uint8_t data[4] = {};
-    uint32_t size = sizeof data;
-    setLastError(status::ok);
-    CHECK_FALSE(host->GetParameter(5, 99, -1, data, size, nullptr, nullptr));
-    CHECK(lastError() == status::fileNotFound);
-}
-
-TEST_CASE_FIXTURE(Seeded, "a value that does not fit costs the user nothing") {
-    write(5, 115, {7, 8, 9, 10, 11});
-    uint8_t data[4] = {};
-    uint32_t size = sizeof data;
-    CHECK_FALSE(host->GetParameter(5, 115, -1, data, size, nullptr, nullptr));
-    CHECK(lastError() == status::moreData);
-    CHECK(value(5, 115) == Bytes{7, 8, 9, 10, 11});
-}
-
-TEST_CASE_FIXTURE(Graph, "without a parameter key no parameter is read") {
-    uint8_t data[4] = {};
-    uint32_t size = sizeof data;
-    CHECK_FALSE(host->GetParameter(5, 115, -1, data, size, nullptr, nullptr));
-    CHECK(size == 4);
 }
 
 TEST_CASE_FIXTURE(Seeded, "without the slot's mutex a reset says so and goes on") {

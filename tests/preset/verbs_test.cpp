@@ -5,6 +5,7 @@
 
 #include <doctest/doctest.h>
 
+#include <CLI/CLI.hpp>
 #include <cstdlib>
 #include <filesystem>
 #include <fstream>

@@ -36,7 +36,7 @@ def native_run(program, library):
     """Whether a run under a native watch was clean, and what it said."""
     with tempfile.TemporaryDirectory(prefix="vxcomn-realtime-") as machine:
         environment = dict(os.environ, VXCOMN_ROOT=machine, RTSAN_OPTIONS="symbolize=0")
-        result = subprocess.run([program, library], capture_output=True, text=True, env=environment, timeout=120)
+        result = subprocess.run([program, library], capture_output=True, text=True, env=environment, timeout=600)
     said = (result.stdout + result.stderr).strip()
     if result.returncode == 2 or result.returncode < 0:
         raise SystemExit(f"{program} {library}: the run failed:\n{said}")

@@ -42,7 +42,7 @@ def run(program, library):
     process = subprocess.Popen([str(wine), program, library], stdout=subprocess.DEVNULL, stderr=subprocess.PIPE, env=environment,
                                text=True, errors="replace")
     blocks, calls = calls_in_blocks(process.stderr)
-    if process.wait(timeout=60) != 0 or blocks == 0:
+    if process.wait(timeout=600) != 0 or blocks == 0:
         raise SystemExit(f"{program} {library}: the run failed after {blocks} blocks, status {process.returncode}")
     others = {name: count for name, count in calls.items() if name not in ALLOWED}
     listed = ", ".join(f"{name} ({count})" for name, count in sorted(calls.items())) or "nothing"

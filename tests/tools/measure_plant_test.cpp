@@ -9,7 +9,7 @@
 #include <numbers>
 
 #include "measure/band_tables.h"
-#include "tools/vx/verb.h"
+#include "tools/vx/failure.h"
 #include "tools/vx_measure/band_grid.h"
 #include "tools/vx_measure/plant.h"
 

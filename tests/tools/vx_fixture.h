@@ -14,8 +14,8 @@
 
 #include "tests/support/process.h"
 #include "tools/vx/audio_file.h"
+#include "tools/vx/failure.h"
 #include "tools/vx/text.h"
-#include "tools/vx/verb.h"
 
 namespace test {
 

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: MIT
 #include "tools/vx/audio_file.h"
 
-#include "tools/vx/verb.h"
+#include "tools/vx/failure.h"
 
 namespace vx {
 

@@ -5,10 +5,10 @@
 #include <cstring>
 
 #include "tools/vx/audio_file.h"
+#include "tools/vx/failure.h"
 #include "tools/vx/riff_reader.h"
 #include "tools/vx/riff_writer.h"
 #include "tools/vx/text.h"
-#include "tools/vx/verb.h"
 
 namespace vx {
 

@@ -12,11 +12,11 @@
 #include <vector>
 
 #include "tools/vx/audio_file.h"
+#include "tools/vx/failure.h"
 #include "tools/vx/quantise.h"
 #include "tools/vx/riff_reader.h"
 #include "tools/vx/riff_writer.h"
 #include "tools/vx/text.h"
-#include "tools/vx/verb.h"
 
 namespace vx {
 

@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: MIT
 #include "tools/vx/console.h"
 
+#include <CLI/CLI.hpp>
 #include <algorithm>
 #include <cstdlib>
 

@@ -4,12 +4,15 @@
 // everything else to standard error.
 #pragma once
 
-#include <CLI/CLI.hpp>
 #include <chrono>
 #include <cstdint>
 #include <cstdio>
 #include <optional>
 #include <string>
+
+namespace CLI {
+class App;
+}
 
 namespace vx {
 

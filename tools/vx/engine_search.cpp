@@ -6,9 +6,9 @@
 #include <filesystem>
 #include <vector>
 
+#include "tools/vx/failure.h"
 #include "tools/vx/system.h"
 #include "tools/vx/text.h"
-#include "tools/vx/verb.h"
 
 namespace vx {
 namespace fs = std::filesystem;
@@ -17,13 +17,15 @@ namespace {
 
 constexpr int kHostTypeWithoutPlatform = 3;
 
-std::vector<fs::path> placesFor(const std::string &module) {
+}  // namespace
+
+std::vector<fs::path> modulePlaces(const std::string &module) {
     std::vector<fs::path> folders;
     if (pathOf(module).has_parent_path()) {
         folders.emplace_back();
     } else {
         folders.push_back(programFolder());
-        const fs::path library = folderOfCode(reinterpret_cast<const void *>(VXDSPAPI_GetProcessFuncAddress()));
+        const fs::path library = fileOfCode(reinterpret_cast<const void *>(VXDSPAPI_GetProcessFuncAddress())).parent_path();
         if (library != programFolder()) folders.push_back(library);
         folders.push_back(moduleSystemFolder());
     }
@@ -32,8 +34,6 @@ std::vector<fs::path> placesFor(const std::string &module) {
         for (const std::string &name : moduleFileNames(module)) places.push_back(folder / pathOf(name));
     return places;
 }
-
-}  // namespace
 
 std::string engineModuleName(const std::string &engine, const std::optional<std::string> &platform, int hostType) {
     if (!platform || hostType == kHostTypeWithoutPlatform) return engine + ".dll";
@@ -45,7 +45,7 @@ std::string engineModuleName(const std::string &engine, const std::optional<std:
 void failEngine(const std::string &engine, const std::optional<std::string> &platform, int hostType) {
     const std::string module = engineModuleName(engine, platform, hostType);
     std::string looked;
-    for (const fs::path &place : placesFor(module)) {
+    for (const fs::path &place : modulePlaces(module)) {
         std::error_code ignored;
         if (!fs::exists(place, ignored)) {
             looked += "\n  " + utf8Of(place);

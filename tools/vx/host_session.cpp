@@ -5,9 +5,9 @@
 #include <bit>
 
 #include "tools/vx/engine_search.h"
+#include "tools/vx/failure.h"
 #include "tools/vx/layout.h"
 #include "tools/vx/text.h"
-#include "tools/vx/verb.h"
 
 namespace vx {
 

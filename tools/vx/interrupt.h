@@ -5,7 +5,7 @@
 
 #include <csignal>
 
-#include "tools/vx/verb.h"
+#include "tools/vx/failure.h"
 
 namespace vx {
 
@@ -23,6 +23,9 @@ class InterruptGuard {
     void check() const {
         if (noted_ != 0) throw Failure(ExitStatus::system, "interrupted; nothing was written");
     }
+
+    // For whom a signal is the usual end.
+    bool noted() const { return noted_ != 0; }
 
   private:
     using Handler = void (*)(int);

@@ -4,8 +4,8 @@
 #include <array>
 #include <bit>
 
+#include "tools/vx/failure.h"
 #include "tools/vx/text.h"
-#include "tools/vx/verb.h"
 
 namespace vx {
 

@@ -8,8 +8,12 @@
 #include <exception>
 #include <iostream>
 
+#include "tools/vx/completion.h"
+#include "tools/vx/run_verb.h"
 #include "tools/vx/system.h"
 #include "tools/vx/verb.h"
+#include "tools/vx_client/client_verbs.h"
+#include "tools/vx_client/endpoint_follower.h"
 #include "tools/vx_measure/measure_verbs.h"
 #include "tools/vx_preset/preset_verbs.h"
 
@@ -36,7 +40,7 @@ int endedByParser(const CLI::App &app, const CLI::ParseError &error) {
 }
 
 int runVx(int argc, char **argv) {
-    CLI::App app("Runs, measures and inspects audio engines and their presets.", "vx");
+    CLI::App app("Runs, measures and inspects audio engines and their presets, and drives the effects of audio endpoints.", "vx");
     app.require_subcommand(1);
     app.allow_windows_style_options(false);  // a path may begin with a slash
     app.set_help_flag("-h,--help", "Print this help");
@@ -46,12 +50,14 @@ int runVx(int argc, char **argv) {
         "Exit status: 0 well; 1 a check failed or something was found; 2 usage; 3 an input is not usable; 4 the system refused.\n"
         "Environment: NO_COLOR turns colour off; VX_GNUPLOT names the gnuplot to draw with.");
     int exitStatus = 0;
-    vx::addRunVerb(app, exitStatus);
+    vx::addRunVerb(app, vx::followEndpoint);
     vx::addLevelsVerb(app, exitStatus);
     vx::addJoinVerb(app, exitStatus);
     vx::addMeasureVerbs(app, exitStatus);
     vx::addSignalVerb(app, exitStatus);
     vx::addPresetVerbs(app, exitStatus);
+    vx::addClientVerbs(app, exitStatus);
+    vx::addCompleteVerb(app);
     std::vector<std::string> arguments = vx::commandLine(argc, argv);
     std::reverse(arguments.begin(), arguments.end());  // as the parser takes them
     try {

@@ -4,8 +4,8 @@
 #include <cerrno>
 #include <cstring>
 
+#include "tools/vx/failure.h"
 #include "tools/vx/text.h"
-#include "tools/vx/verb.h"
 
 namespace vx {
 namespace fs = std::filesystem;

@@ -5,8 +5,8 @@
 #include <cmath>
 #include <optional>
 
+#include "tools/vx/failure.h"
 #include "tools/vx/text.h"
-#include "tools/vx/verb.h"
 
 namespace vx {
 

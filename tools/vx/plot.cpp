@@ -5,10 +5,10 @@
 #include <cstdlib>
 #include <iostream>
 
+#include "tools/vx/failure.h"
 #include "tools/vx/output_file.h"
 #include "tools/vx/system.h"
 #include "tools/vx/text.h"
-#include "tools/vx/verb.h"
 
 namespace vx {
 namespace fs = std::filesystem;

@@ -6,8 +6,8 @@
 #include <bit>
 #include <cstring>
 
+#include "tools/vx/failure.h"
 #include "tools/vx/text.h"
-#include "tools/vx/verb.h"
 
 namespace vx {
 

@@ -4,8 +4,8 @@
 #include <algorithm>
 #include <bit>
 
+#include "tools/vx/failure.h"
 #include "tools/vx/quantise.h"
-#include "tools/vx/verb.h"
 
 namespace vx {
 

@@ -13,8 +13,8 @@ constexpr int kMostLoops = 1000000;
 constexpr double kMostSeconds = 30.0 * 24 * 3600;
 
 void addEngineOptions(CLI::App &verb, RunOptions &options) {
-    verb.add_option("--engine", options.engine, "Engine module, without its ending")
-        ->capture_default_str()
+    verb.add_option("--engine", options.engine, "Engine module, without its ending; with --follow the endpoint's if not given")
+        ->default_str(kUsualEngine)
         ->type_name("NAME")
         ->group("Engine");
     verb.add_option("--platform", options.platform, "Platform name: Float, HiFi2, iSST or AIC326x; none if not given")
@@ -74,10 +74,31 @@ void addFormatOptions(CLI::App &verb, RunOptions &options) {
         ->group(group);
 }
 
+void addFollowOptions(CLI::App &verb, RunOptions &options) {
+    const char *group = "Following";
+    CLI::Option *const follow =
+        verb.add_option("--follow", options.follow,
+                        "Play in real time with the settings of this endpoint's effect slot, and take every change as it comes")
+            ->type_name("ENDPOINT")
+            ->group(group);
+    verb.add_option("--apo", options.apo, "The slot: EFX, MFX, SFX, LFX or GFX")
+        ->check(CLI::IsMember({"EFX", "MFX", "SFX", "LFX", "GFX"}, CLI::ignore_case))
+        ->capture_default_str()
+        ->needs(follow)
+        ->type_name("SLOT")
+        ->group(group);
+    verb.add_flag("--real-time", options.realTime, "Play as fast as it sounds, not as fast as it goes")->group(group);
+}
+
 void addResultOptions(CLI::App &verb, RunOptions &options) {
     const char *group = "Results";
     verb.add_option("--plot", options.plots,
                     "Draw a histogram of the load into a .svg or .png, with the numbers as .csv beside it; may be repeated")
+        ->allow_extra_args(false)
+        ->type_name("FILE")
+        ->group(group);
+    verb.add_option("--levels-plot", options.levelsPlots,
+                    "Draw the levels over time into a .svg or .png, with changes that came by --follow; may be repeated")
         ->allow_extra_args(false)
         ->type_name("FILE")
         ->group(group);
@@ -97,6 +118,7 @@ void addRunOptions(CLI::App &verb, RunOptions &options) {
         ->type_name("FILE");
     addEngineOptions(verb, options);
     addFormatOptions(verb, options);
+    addFollowOptions(verb, options);
     addResultOptions(verb, options);
     addCommonOptions(verb, options.common);
     verb.footer("Settings for --set:\n" + settingNames() + "\nLayouts: " + layoutNames() +
@@ -104,7 +126,8 @@ void addRunOptions(CLI::App &verb, RunOptions &options) {
                 "\nExamples:\n"
                 "  vx run speech.wav -o louder.wav --set voice=0.9 --set detail=-6dB\n"
                 "  vx run film.wav -o stereo.wav --layout stereo --set bass=1 --set eq3=+6dB\n"
-                "  vx run speech.wav --param 3,-12=f32:2.0 --plot load.svg --json\n");
+                "  vx run speech.wav --param 3,-12=f32:2.0 --plot load.svg --json\n"
+                "  vx run speech.wav -o heard.wav --follow speakers --apo EFX --levels-plot when.svg\n");
 }
 
 void checkRunOptions(const RunOptions &options) {

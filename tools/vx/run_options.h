@@ -3,7 +3,6 @@
 // What `vx run` was asked for: the command line, checked.
 #pragma once
 
-#include <CLI/CLI.hpp>
 #include <cstdint>
 #include <optional>
 #include <string>
@@ -11,13 +10,17 @@
 
 #include "tools/vx/console.h"
 
+namespace CLI {
+class App;
+}
+
 namespace vx {
 
 struct RunOptions {
     CommonOptions common;
     std::string input;
     std::string output;
-    std::string engine = "SampleEngine";
+    std::optional<std::string> engine;  // nothing: the endpoint's if one is followed, else the sample engine
     std::optional<std::string> platform;
     int hostType = 0;
     uint32_t hardware = 0;
@@ -33,10 +36,16 @@ struct RunOptions {
     int recordRate = 0;
     std::string bits;
     std::vector<std::string> plots;
+    std::vector<std::string> levelsPlots;
     std::string levelsCsv;
+    std::string follow;  // an endpoint; empty: none
+    std::string apo = "EFX";
+    bool realTime = false;
     bool digest = false;
     bool force = false;
 };
+
+inline constexpr const char *kUsualEngine = "SampleEngine";
 
 void addRunOptions(CLI::App &verb, RunOptions &options);
 

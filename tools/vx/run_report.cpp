@@ -65,11 +65,22 @@ nlohmann::ordered_json levelJson(uint32_t mask, const std::vector<ChannelLevel> 
     return json;
 }
 
+nlohmann::ordered_json numberOrNull(const std::optional<double> &number) {
+    return number ? nlohmann::ordered_json(*number) : nlohmann::ordered_json();
+}
+
 nlohmann::ordered_json layoutJson(uint32_t mask) {
     return {{"layout", layoutName(mask)}, {"mask", mask}, {"channels", channelCount(mask)}};
 }
 
 }  // namespace
+
+std::string changeText(const FollowedChange &change) {
+    std::string text = change.text + "  by " + change.writer;
+    if (change.takenMs) text += textf("; %.2f ms from the write to the engine", *change.takenMs);
+    if (change.heardMs) text += textf(", %.2f ms to the first block with it", *change.heardMs);
+    return text;
+}
 
 std::string digestText(uint64_t digest) {
     return textf("%016llx", static_cast<unsigned long long>(digest));
@@ -90,6 +101,7 @@ std::string runText(const RunOptions &options, const RunReport &report, const St
         if (answer.result == 0) text += style.warning("  answered with 0: the engine may not have taken it");
         text += "\n";
     }
+    for (const FollowedChange &change : report.changes) text += textf("%8.3f s ", change.seconds) + changeText(change) + "\n";
     text += "\n" + style.bold("levels           peak, 0 dB = 1.0   above 1.0") + "\n";
     text += levelRows("in", report.fileMask, report.inputLevels, style);
     text += levelRows("out", report.outputMask, report.outputLevels, style);
@@ -123,6 +135,20 @@ std::string runJson(const RunOptions &options, const RunReport &report, const st
                          {"channel", answer.write.channel},
                          {"answer", answer.result}});
         json["parameters"].push_back(sent);
+    }
+    if (!options.follow.empty()) {
+        json["followed"] = {
+            {"definition",
+             "seconds: of audio, at the first block that carried the change; takenMs: from the write until the engine had "
+             "it; heardMs: from the write until that block was ready"},
+            {"changes", nlohmann::ordered_json::array()}};
+        for (const FollowedChange &change : report.changes)
+            json["followed"]["changes"].push_back({{"seconds", change.seconds},
+                                                   {"name", change.name},
+                                                   {"text", change.text},
+                                                   {"writer", change.writer},
+                                                   {"takenMs", numberOrNull(change.takenMs)},
+                                                   {"heardMs", numberOrNull(change.heardMs)}});
     }
     json["frames"] = report.frames;
     json["seconds"] = audioSeconds(report);

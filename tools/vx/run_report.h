@@ -19,4 +19,7 @@ std::string loadPlotCommands(const RunOptions &options, const RunReport &report)
 
 std::string digestText(uint64_t digest);
 
+// What changed, by whom, and how long it took.
+std::string changeText(const FollowedChange &change);
+
 }  // namespace vx

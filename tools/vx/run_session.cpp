@@ -6,13 +6,16 @@
 #include <cmath>
 #include <memory>
 #include <optional>
+#include <thread>
 
+#include "tools/vx/engine_seat.h"
+#include "tools/vx/failure.h"
 #include "tools/vx/interrupt.h"
 #include "tools/vx/layout.h"
 #include "tools/vx/levels_csv.h"
+#include "tools/vx/levels_plot.h"
 #include "tools/vx/slot_buffers.h"
 #include "tools/vx/text.h"
-#include "tools/vx/verb.h"
 
 namespace vx {
 
@@ -86,6 +89,7 @@ struct Outputs {
     std::unique_ptr<OutputFile> file;
     std::unique_ptr<AudioWriter> writer;
     std::unique_ptr<LevelsCsv> levels;
+    std::unique_ptr<LevelsPlot> levelsPlot;
 
     void commit() {
         if (writer) writer->finish();
@@ -109,6 +113,8 @@ Outputs openOutputs(const RunOptions &options, RunReport &report, std::optional<
     if (!options.levelsCsv.empty())
         outputs.levels =
             std::make_unique<LevelsCsv>(options.levelsCsv, options.force, report.fileMask, report.outputMask, format.sampleRate);
+    if (!options.levelsPlots.empty())
+        outputs.levelsPlot = std::make_unique<LevelsPlot>(options.levelsPlots, options.force, format.sampleRate);
     return outputs;
 }
 
@@ -119,8 +125,25 @@ std::vector<ParameterWrite> parameterWrites(const RunOptions &options) {
     return writes;
 }
 
-void playBlocks(const RunOptions &options, HostSession &host, AudioReader &reader, std::optional<uint64_t> frames, Outputs &outputs,
-                RunReport &report) {
+// Holds a run back to the speed of its sound.
+class Pace {
+  public:
+    Pace(bool realTime, int sampleRate) : realTime_(realTime), sampleRate_(sampleRate), begin_(Clock::now()) {}
+
+    void waitFor(uint64_t frame) const {
+        if (!realTime_) return;
+        const std::chrono::duration<double> due(static_cast<double>(frame) / sampleRate_);
+        std::this_thread::sleep_until(begin_ + std::chrono::duration_cast<Clock::duration>(due));
+    }
+
+  private:
+    bool realTime_;
+    int sampleRate_;
+    Clock::time_point begin_;
+};
+
+void playBlocks(const RunOptions &options, EngineSeat &seat, RunFollower *follower, AudioReader &reader,
+                std::optional<uint64_t> frames, Outputs &outputs, RunReport &report) {
     const int rate = report.file.sampleRate;
     IOFormat input = makeFormat(report.fileMask, options.block, rate);
     IOFormat output = makeFormat(report.outputMask, options.block, rate);
@@ -133,6 +156,7 @@ void playBlocks(const RunOptions &options, HostSession &host, AudioReader &reade
     std::vector<float> after(static_cast<size_t>(options.block * output.channels));
     Progress progress("run", frames, options.common.quiet || options.common.json);
     const InterruptGuard interrupt;
+    const Pace pace(options.realTime || follower != nullptr, rate);
     while (!frames || report.frames < *frames) {
         const auto wanted = static_cast<size_t>(options.block);
         const size_t got =
@@ -141,9 +165,13 @@ void playBlocks(const RunOptions &options, HostSession &host, AudioReader &reade
         inputMeter.feed(before.data(), got);
         slots.scatter(before.data(), input, got);
         input.frames = output.frames = static_cast<int32_t>(got);
+        pace.waitFor(report.frames);
+        seat.renew();
+        if (follower != nullptr) follower->beforeBlock(static_cast<double>(report.frames) / rate);
         const Clock::time_point begin = Clock::now();
-        host.process(slots.record(), input, output);
+        seat.host().process(slots.record(), input, output);
         const auto took = std::chrono::duration_cast<std::chrono::nanoseconds>(Clock::now() - begin).count();
+        if (follower != nullptr) follower->afterBlock();
         report.load.add(static_cast<uint64_t>(std::max<int64_t>(took, 0)));
         if (slots.record().silent != 0) report.silentFrames += got;
         slots.gather(after.data(), output, got);
@@ -152,8 +180,13 @@ void playBlocks(const RunOptions &options, HostSession &host, AudioReader &reade
         if (outputs.writer) outputs.writer->write(after.data(), got);
         if (outputs.levels)
             outputs.levels->add(report.frames, inputMeter.blockPeaks(), outputMeter.blockPeaks(), static_cast<double>(took));
+        if (outputs.levelsPlot)
+            outputs.levelsPlot->feed(before.data(), got * static_cast<size_t>(input.channels), after.data(),
+                                     got * static_cast<size_t>(output.channels), got);
         report.frames += got;
         progress.update(report.frames);
+        // Who follows has no other end than a signal when the file is long, and keeps what was played.
+        if (follower != nullptr && interrupt.noted()) break;
         interrupt.check();
     }
     report.inputLevels = inputMeter.levels();
@@ -163,7 +196,7 @@ void playBlocks(const RunOptions &options, HostSession &host, AudioReader &reade
 
 }  // namespace
 
-RunReport runSession(const RunOptions &options) {
+RunReport runSession(const RunOptions &options, RunFollower *follower) {
     const std::vector<ParameterWrite> writes = parameterWrites(options);
     const Clock::time_point begin = Clock::now();
     RunReport report;
@@ -178,19 +211,25 @@ RunReport runSession(const RunOptions &options) {
     const std::optional<uint64_t> frames = framesToPlay(options, *reader);
     if (frames == 0) throw Failure(ExitStatus::input, options.input + ": holds no audio; nothing to play");
 
-    EngineChoice choice = {options.engine,   options.platform,    options.hostType,
-                           options.hardware, options.commandLine, options.recordRate};
+    EngineChoice choice = {options.engine.value_or(kUsualEngine),
+                           options.platform,
+                           options.hostType,
+                           options.hardware,
+                           options.commandLine,
+                           options.recordRate};
     if (choice.recordRate == 0) choice.recordRate = report.file.sampleRate;
-    HostSession host(choice);
-    report.engineFile = host.engineFile();
-    host.start(makeFormat(report.inputMask, options.block, report.file.sampleRate),
-               makeFormat(report.outputMask, options.block, report.file.sampleRate));
-    for (const ParameterWrite &write : writes) report.parameters.push_back(host.send(write));
+    EngineSeat seat(choice, makeFormat(report.inputMask, options.block, report.file.sampleRate),
+                    makeFormat(report.outputMask, options.block, report.file.sampleRate), writes, follower);
+    report.engineFile = seat.host().engineFile();
+    report.parameters = seat.answers();
 
     Outputs outputs = openOutputs(options, report, frames);
-    playBlocks(options, host, *reader, frames, outputs, report);
+    playBlocks(options, seat, follower, *reader, frames, outputs, report);
     if (report.frames == 0) throw Failure(ExitStatus::input, options.input + ": holds no audio; nothing to play");
     outputs.commit();
+    if (follower != nullptr) report.changes = follower->changes();
+    if (outputs.levelsPlot)
+        report.levelsPlots = outputs.levelsPlot->draw(options.input + " through " + report.engineFile, report.changes);
     report.wallSeconds = std::chrono::duration<double>(Clock::now() - begin).count();
     return report;
 }

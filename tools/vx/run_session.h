@@ -11,6 +11,7 @@
 #include "tools/vx/host_session.h"
 #include "tools/vx/level_meter.h"
 #include "tools/vx/load_statistics.h"
+#include "tools/vx/run_follower.h"
 #include "tools/vx/run_options.h"
 
 namespace vx {
@@ -30,10 +31,13 @@ struct RunReport {
     uint64_t digest = 0;
     double wallSeconds = 0.0;
     std::string sampleText;  // of the output file
+    std::vector<FollowedChange> changes;
+    std::vector<std::string> levelsPlots;  // files that were drawn
 
     double blockNs(int block) const { return 1e9 * block / file.sampleRate; }
 };
 
-RunReport runSession(const RunOptions &options);
+// `follower` may be null.
+RunReport runSession(const RunOptions &options, RunFollower *follower);
 
 }  // namespace vx

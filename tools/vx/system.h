@@ -34,13 +34,18 @@ std::optional<uint64_t> fileSize(std::FILE *file);
 std::FILE *binaryInput();
 std::FILE *binaryOutput();
 
+// From here on a write to a pipe that nobody reads any more fails instead of ending the program.
+void surviveClosedOutput();
+// Whether standard output is a pipe that nobody reads any more, as far as the system tells before something is written.
+bool outputClosed();
+
 bool isTerminal(std::FILE *stream);
 int terminalWidth(std::FILE *stream);
 unsigned long processId();
 
-// The folders of this program and of the module that a piece of code lies in.
+// The folder of this program, and the file of the module that a piece of code lies in.
 std::filesystem::path programFolder();
-std::filesystem::path folderOfCode(const void *code);
+std::filesystem::path fileOfCode(const void *code);
 
 // The names under which this platform looks for the module `name` ("X.dll"), first to last.
 std::vector<std::string> moduleFileNames(const std::string &name);

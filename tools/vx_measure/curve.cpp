@@ -7,9 +7,9 @@
 #include <cstring>
 #include <optional>
 
+#include "tools/vx/failure.h"
 #include "tools/vx/system.h"
 #include "tools/vx/text.h"
-#include "tools/vx/verb.h"
 
 namespace vx {
 

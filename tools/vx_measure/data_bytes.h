@@ -8,7 +8,7 @@
 #include <cstring>
 #include <vector>
 
-#include "tools/vx/verb.h"
+#include "tools/vx/failure.h"
 
 namespace vx {
 

@@ -8,7 +8,7 @@
 #include <cmath>
 #include <numbers>
 
-#include "tools/vx/verb.h"
+#include "tools/vx/failure.h"
 
 namespace vx {
 

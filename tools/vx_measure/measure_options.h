@@ -3,11 +3,14 @@
 // What all of `vx measure` is asked for: the engine and the format, the chain, and where results go.
 #pragma once
 
-#include <CLI/CLI.hpp>
 #include <string>
 #include <vector>
 
 #include "tools/vx/console.h"
+
+namespace CLI {
+class App;
+}
 
 namespace vx {
 

@@ -1,6 +1,8 @@
 // SPDX-License-Identifier: MIT
 #include "tools/vx_measure/measure_verbs.h"
 
+#include <CLI/CLI.hpp>
+
 namespace vx {
 
 void addMeasureVerbs(CLI::App &app, int &exitStatus) {

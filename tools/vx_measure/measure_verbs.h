@@ -3,7 +3,9 @@
 // The verb groups `vx measure` and `vx signal`. addMeasureVerbs calls the functions behind it, one a subcommand.
 #pragma once
 
-#include <CLI/CLI.hpp>
+namespace CLI {
+class App;
+}
 
 namespace vx {
 

@@ -4,9 +4,9 @@
 #include <algorithm>
 #include <cmath>
 
+#include "tools/vx/failure.h"
 #include "tools/vx/layout.h"
 #include "tools/vx/text.h"
-#include "tools/vx/verb.h"
 
 namespace vx {
 

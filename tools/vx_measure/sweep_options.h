@@ -3,9 +3,11 @@
 // The sweep's own options, which `vx measure sweep` and `vx signal sweep` share.
 #pragma once
 
-#include <CLI/CLI.hpp>
-
 #include "tools/vx_measure/sweep_measurement.h"
+
+namespace CLI {
+class App;
+}
 
 namespace vx {
 

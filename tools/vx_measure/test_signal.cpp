@@ -2,6 +2,7 @@
 #include "tools/vx_measure/test_signal.h"
 
 #include <VXDSPAPI.h>
+#include <CLI/CLI.hpp>
 
 #include "tools/vx/text.h"
 #include "tools/vx_measure/data_bytes.h"

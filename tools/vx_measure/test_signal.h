@@ -3,10 +3,13 @@
 // The library's steady test signals by name: "white", "pink", "sine", or none. Switched on over the host's commands.
 #pragma once
 
-#include <CLI/CLI.hpp>
 #include <string>
 
 #include "tools/vx_measure/rig.h"
+
+namespace CLI {
+class App;
+}
 
 namespace vx {
 

@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: MIT
 #include "tools/vx_preset/preset_verbs.h"
 
+#include <CLI/CLI.hpp>
 #include <functional>
 #include <iostream>
 #include <memory>

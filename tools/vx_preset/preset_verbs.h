@@ -3,7 +3,9 @@
 // The verb group `vx preset`: presets and packages from readable JSON and back.
 #pragma once
 
-#include <CLI/CLI.hpp>
+namespace CLI {
+class App;
+}
 
 namespace vx {
 

@@ -87,14 +87,12 @@ TEST_CASE_FIXTURE(Walk, "no value goes with another's stamp, however fast anothe
     const auto noteWritten = [&](const std::string &line) {
         written[std::stoull(line)] = static_cast<uint32_t>(std::stoul(line.substr(line.find(' '))));
     };
-    for (int walk = 0; walk < 2000; ++walk) {
+    while (seen.size() < 1000) {
         host.UpdateParametersFromRegistry(true, false);
         note();
-        if (walk % 4 == 0) {
-            const auto line = writer.readLine();
-            REQUIRE(line);
-            noteWritten(*line);
-        }
+        const auto line = writer.readLine();
+        REQUIRE(line);
+        noteWritten(*line);
     }
     writer.kill();
     while (const auto line = writer.readLine()) noteWritten(*line);
@@ -112,7 +110,6 @@ TEST_CASE_FIXTURE(Walk, "no value goes with another's stamp, however fast anothe
     }
     CHECK(strange == 0);
     CHECK(unsaid <= 2);
-    CHECK(seen.size() > 100);
 }
 
 TEST_CASE_FIXTURE(Walk, "a thread whose root key is deleted walks once more and ends") {

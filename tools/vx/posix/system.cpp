@@ -2,6 +2,7 @@
 #include "tools/vx/system.h"
 
 #include <dlfcn.h>
+#include <poll.h>
 #include <spawn.h>
 #include <sys/ioctl.h>
 #include <sys/stat.h>
@@ -9,6 +10,7 @@
 #include <unistd.h>
 
 #include <cerrno>
+#include <csignal>
 #include <cstdlib>
 
 extern char **environ;
@@ -55,6 +57,15 @@ std::FILE *binaryOutput() {
     return stdout;
 }
 
+void surviveClosedOutput() {
+    std::signal(SIGPIPE, SIG_IGN);
+}
+
+bool outputClosed() {
+    pollfd output = {STDOUT_FILENO, 0, 0};
+    return poll(&output, 1, 0) > 0 && (output.revents & POLLERR) != 0;
+}
+
 bool isTerminal(std::FILE *stream) {
     return isatty(fileno(stream)) != 0;
 }
@@ -73,11 +84,11 @@ fs::path programFolder() {
     return fs::read_symlink("/proc/self/exe", ignored).parent_path();
 }
 
-fs::path folderOfCode(const void *code) {
+fs::path fileOfCode(const void *code) {
     Dl_info info = {};
     if (dladdr(code, &info) == 0 || info.dli_fname == nullptr) return {};
     std::error_code ignored;
-    return fs::absolute(info.dli_fname, ignored).parent_path();
+    return fs::absolute(info.dli_fname, ignored);
 }
 
 std::vector<std::string> moduleFileNames(const std::string &name) {

@@ -82,6 +82,12 @@ std::FILE *binaryOutput() {
     return binary(stdout);
 }
 
+void surviveClosedOutput() {}
+
+bool outputClosed() {
+    return false;
+}
+
 bool isTerminal(std::FILE *stream) {
     DWORD mode = 0;
     return GetConsoleMode(reinterpret_cast<HANDLE>(_get_osfhandle(_fileno(stream))), &mode) != 0;
@@ -101,11 +107,11 @@ fs::path programFolder() {
     return pathOfModule(nullptr).parent_path();
 }
 
-fs::path folderOfCode(const void *code) {
+fs::path fileOfCode(const void *code) {
     HMODULE module = nullptr;
     const DWORD flags = GET_MODULE_HANDLE_EX_FLAG_FROM_ADDRESS | GET_MODULE_HANDLE_EX_FLAG_UNCHANGED_REFCOUNT;
     const auto address = static_cast<LPCWSTR>(code);
-    return GetModuleHandleExW(flags, address, &module) != 0 ? pathOfModule(module).parent_path() : fs::path();
+    return GetModuleHandleExW(flags, address, &module) != 0 ? pathOfModule(module) : fs::path();
 }
 
 std::vector<std::string> moduleFileNames(const std::string &name) {

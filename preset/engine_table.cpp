@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: MIT
-#include "host/engine_table.h"
+#include "preset/engine_table.h"
 
 namespace vxcomn {
 
