@@ -20,6 +20,7 @@ int main() {
         vxcomn::bench::printHeading("control_bench");
         vxcomn::bench::printOpeningFigures();
         vxcomn::bench::printEnumerationFigures();
+        vxcomn::bench::printSliderFigures();
     } catch (const std::exception &error) {
         std::fprintf(stderr, "control_bench: %s\n", error.what());
         result = 1;

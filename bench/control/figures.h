@@ -4,14 +4,11 @@
 #pragma once
 
 #include <algorithm>
-#include <stdexcept>
 #include <vector>
 
-namespace vxcomn::bench {
+#include "bench/support/require.h"
 
-inline void require(bool done, const char *what) {
-    if (!done) throw std::runtime_error(what);
-}
+namespace vxcomn::bench {
 
 inline double medianOf(std::vector<double> values) {
     const auto middle = values.begin() + static_cast<std::ptrdiff_t>(values.size() / 2);
@@ -21,5 +18,6 @@ inline double medianOf(std::vector<double> values) {
 
 void printOpeningFigures();
 void printEnumerationFigures();
+void printSliderFigures();
 
 }  // namespace vxcomn::bench

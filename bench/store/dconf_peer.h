@@ -8,7 +8,7 @@
 
 #include <sys/types.h>
 
-#include "bench/store/shared_page.h"
+#include "bench/support/shared_page.h"
 
 namespace vxcomn::bench {
 

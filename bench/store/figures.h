@@ -4,8 +4,8 @@
 #pragma once
 
 #include <filesystem>
-#include <stdexcept>
 
+#include "bench/support/require.h"
 #include "preset/parameter_store.h"
 #include "preset/store_names.h"
 
@@ -15,11 +15,6 @@ void printWriteAndReadFigures(const std::filesystem::path &folder);
 void printWakeFigures(const std::filesystem::path &folder);
 void printWalkFigures();
 void printPresetFigures(const std::filesystem::path &folder);
-
-// What must go well for a figure to mean anything.
-inline void require(bool well, const char *what) {
-    if (!well) throw std::runtime_error(what);
-}
 
 // A parameter key as a host has it.
 inline WideString benchParameterKey() {

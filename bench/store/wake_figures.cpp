@@ -15,6 +15,7 @@
 #include <unistd.h>
 
 #include "bench/store/dconf_peer.h"
+#include "bench/store/figures.h"
 #include "bench/support/timing.h"
 #include "platform/change_signal.h"
 

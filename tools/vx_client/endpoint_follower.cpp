@@ -162,7 +162,7 @@ class EndpointFollower final : public RunFollower, private ChangeListener {
     }
 
     void note(const ParameterChange &change, const ParameterChange *before, bool written) {
-        const auto text = [&](const ParameterChange &value) { return rawText(value.componentId, value.paramId, value.data); };
+        const auto text = [&](const ParameterChange &value) { return spokenText(value.componentId, value.paramId, value.data); };
         FollowedChange followed;
         followed.name = parameterTitle(change.componentId, change.paramId);
         if (followed.name.empty()) followed.name = textf("%d,%d", change.componentId, change.paramId);

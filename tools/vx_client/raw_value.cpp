@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: MIT
 #include "tools/vx_client/raw_value.h"
 
+#include "preset/byte_cursor.h"
 #include "tools/vx/failure.h"
 #include "tools/vx/text.h"
 #include "tools/vx_client/user_parameters.h"
@@ -12,6 +13,7 @@ namespace vx::client {
 namespace {
 
 constexpr int kLowestComponent = -4, kHighestComponent = 31, kLowestId = -64, kHighestId = 256;
+constexpr size_t kBandBytes = 13;  // the last four are the gain in decibels
 
 }  // namespace
 
@@ -38,6 +40,16 @@ std::string rawText(int32_t componentId, int32_t paramId, std::span<const uint8_
     constexpr size_t kMostShown = 64;
     if (bytes.size() > kMostShown) return textf("%zu bytes", bytes.size());
     return preset::valueText(componentId, paramId, bytes);
+}
+
+std::string spokenText(int32_t componentId, int32_t paramId, std::span<const uint8_t> bytes) {
+    const UserParameter *const parameter = userParameterAt(componentId, paramId);
+    const bool isBand = bytes.size() == kBandBytes;
+    if (parameter == nullptr || parameter->isSwitch || (!isBand && bytes.size() != sizeof(float)))
+        return rawText(componentId, paramId, bytes);
+    float number = 0.0F;
+    vxcomn::ByteCursor(bytes.last(sizeof number)).f32(number);
+    return isBand ? textf("%.2f dB", static_cast<double>(number)) : decibelText(static_cast<double>(number));
 }
 
 Json rawJson(int32_t componentId, int32_t paramId, std::span<const uint8_t> bytes) {

@@ -25,6 +25,8 @@ std::string parameterTitle(int32_t componentId, int32_t paramId);
 
 // The value in its usual form, as text and as JSON ("hex" always, beside it "on", "float" or "band" where one is known).
 std::string rawText(int32_t componentId, int32_t paramId, std::span<const uint8_t> bytes);
+// The same for a reader of changes: levels and bands in decibels.
+std::string spokenText(int32_t componentId, int32_t paramId, std::span<const uint8_t> bytes);
 Json rawJson(int32_t componentId, int32_t paramId, std::span<const uint8_t> bytes);
 
 }  // namespace vx::client

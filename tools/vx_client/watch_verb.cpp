@@ -68,8 +68,8 @@ class Watcher final : public ChangeListener {
             const Value now = {change.data, levelOf(change), change.time};
             const auto found = values_.find(key);
             const bool known = found != values_.end();
-            // All that stands there is news only where it is another write than the one that is known.
-            const bool old = all && known && found->second.time == now.time;
+            // Where a selection has moved, all comes anew; what is as before is no news.
+            const bool old = all && known && found->second.data == now.data;
             if (!old && (started_ || options_.initial)) tell(change, known ? &found->second : nullptr, now);
             values_[key] = now;
         }
@@ -114,7 +114,7 @@ class Watcher final : public ChangeListener {
         if (value == nullptr) return "-";
         const UserParameter *const parameter = userParameterAt(change.componentId, change.paramId);
         if (parameter != nullptr && value->level) return userValueText(*parameter, *value->level);
-        return rawText(change.componentId, change.paramId, value->data);
+        return spokenText(change.componentId, change.paramId, value->data);
     }
 
     static Json json(const ParameterChange &change, const Value *value) {

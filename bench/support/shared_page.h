@@ -9,11 +9,11 @@
 #include <sys/mman.h>
 #include <time.h>
 
-#include "bench/store/figures.h"
+#include "bench/support/require.h"
 
 namespace vxcomn::bench {
 
-enum class Way : uint32_t { futex, store, dconf, end };
+enum class Way : uint32_t { futex, store, dconf, sound, end };
 
 struct SharedPage {
     std::atomic<uint32_t> word, round;
