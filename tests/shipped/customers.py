@@ -18,7 +18,7 @@ import sys
 import tempfile
 
 LINUX_FILES = [
-    "bin/vx", "bin/vxreg", "lib/libVXCOMN64U.so", "lib/libVXCOMN64U.so.2", "lib/SampleEngine.so", "lib/SampleEngine.DSP.HiFi2.so",
+    "bin/vx", "bin/vxreg", "lib/libVXCOMN64U.so", "lib/SampleEngine.so", "lib/SampleEngine.DSP.HiFi2.so",
     "lib/cmake/vxcomn/vxcomn-config.cmake", "lib/cmake/vxcomn/vxcomn-config-version.cmake", "lib/pkgconfig/vxcomn.pc",
     "include/VXDSPAPI.h", "include/vxcomn/engine.h", "share/man/man1/vx.1", "share/man/man1/vxreg.1",
     "share/bash-completion/completions/vx", "share/doc/vxcomn/README.md", "share/doc/vxcomn/docs/architecture.md",
