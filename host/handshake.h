@@ -51,9 +51,9 @@ class ProcessHold {
 // Keeps one block function off a group of fields for a scope: it goes on, and leaves out what the byte stands for.
 class FieldHold {
   public:
-    FieldHold(LibraryContext &context, VXAtomicByte &byte, const VXAtomicByte &busy) noexcept
-        : lock_(controlLock(&context)), byte_(byte) {
-        stopBlocks(byte, busy);
+    FieldHold(LibraryContext &context, VXAtomicByte &stop, const VXAtomicByte &busy) noexcept
+        : lock_(controlLock(&context)), byte_(stop) {
+        stopBlocks(stop, busy);
     }
     ~FieldHold() { byte_.store(0, std::memory_order_release); }
     FieldHold(const FieldHold &) = delete;

@@ -137,7 +137,8 @@ bool WriteParameter(const CTraceFuncCallTarget *trace, WideView parameterKey, in
         setLastError(status::invalidParameter);
         return false;
     }
-    const WideString component = decimalName(componentId);
+    // All that needs memory is made ahead of the write, so that who is told of none finds nothing written.
+    const WideString path(parameterKey), component = decimalName(componentId);
     const WideString name = parameterValueName(paramId, isTransient ? source.id : WideView());
     const GUID *const guid = source.id.empty() ? nullptr : &source.guid;
     WriteSteps steps;
@@ -153,7 +154,6 @@ bool WriteParameter(const CTraceFuncCallTarget *trace, WideView parameterKey, in
             if (whole != status::ok) steps.componentStamp = whole;  // each step went well, and yet all together did not
         }
     }
-    const WideString path(parameterKey);
     logFailure(trace, steps.key, VX_TEXT("Failed to open reg key: %s with error code %i\n"), path);
     logFailure(trace, steps.component, VX_TEXT("Failed to create reg value: %s with error code %i\n"), component);
     logFailure(trace, steps.data, VX_TEXT("Failed to create 'Data' reg value with error code %i\n"));

@@ -138,15 +138,17 @@ bool meansDamage(int result, const std::string &path) {
     }
 }
 
-// Opens the file; one that is damaged is set aside first. The lock must be held.
+// Opens the file; one that is damaged, which two attempts must agree on, is set aside first. The lock must be held.
 std::unique_ptr<StoreConnection> openWhole(const std::string &path) {
     const auto file = look(path), journal = look(path + "-wal");
     if ((!file || file->st_size == 0) && journal && journal->st_size > 0) setAside(path, "there is only its journal");
-    try {
-        return std::make_unique<StoreConnection>(path);
-    } catch (const StoreError &error) {
-        if (!meansDamage(error.result, path)) throw;
-        setAside(path, sqlite3_errstr(error.result));
+    for (const bool isSecond : {false, true}) {
+        try {
+            return std::make_unique<StoreConnection>(path);
+        } catch (const StoreError &error) {
+            if (!meansDamage(error.result, path)) throw;
+            if (isSecond) setAside(path, sqlite3_errstr(error.result));
+        }
     }
     return std::make_unique<StoreConnection>(path);
 }
@@ -170,7 +172,8 @@ class Store {
         return *connection;
     }
 
-    // After a statement's error. True if there is a fresh file now, or will be: it is worth to try again.
+    // After a statement's error. True if it is worth to try again, on a connection made anew or, the second time, a fresh file: a
+    // file that could not be opened or read for a moment may look damaged, too, and would be lost.
     bool replace(int result) {
         if (!meansDamage(result, path_)) return false;
         const FileLock lock(lockPath_);
@@ -179,11 +182,13 @@ class Store {
         const bool ours = connection != nullptr && connection->inPlace();
         if (connection != nullptr) connection->leaveFilesAlone();
         closeConnection();
-        if (ours) setAside(path_, sqlite3_errstr(result));
+        if (ours && suspected_) setAside(path_, sqlite3_errstr(result));
+        suspected_ = true;
         return true;
     }
 
   private:
+    bool suspected_ = false;
     std::string path_, lockPath_;
 };
 
@@ -280,7 +285,7 @@ Status inOneWrite(const std::function<Status()> &work) {
 }
 
 Status runInStore(bool writes, StoreTask &task) noexcept {
-    constexpr int kAttempts = 3;
+    constexpr int kAttempts = 4;
     try {
         if (ownConnection != nullptr) return runInside(*ownConnection, task);
         const std::lock_guard lock(storeMutex);

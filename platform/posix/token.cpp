@@ -73,7 +73,7 @@ void forgetInChild() {
 // Held while token files are made, opened and removed; goes with the process that holds it.
 class Guard {
   public:
-    explicit Guard(const std::string &folder) : file_(openForAll(folder + kGuardName)) {
+    explicit Guard(const std::string &path) noexcept : file_(openForAll(path)) {
         while (file_ && flock(file_.get(), LOCK_EX) != 0) {
             if (errno != EINTR) file_.reset();
         }
@@ -86,25 +86,20 @@ class Guard {
 
 // Takes away what processes that were killed have left. The guard must be held.
 void sweep(const std::string &folder) {
-    DIR *list = opendir(folder.c_str());
-    if (list == nullptr) return;
-    while (const dirent *entry = readdir(list)) {
+    const std::unique_ptr<DIR, int (*)(DIR *)> list(opendir(folder.c_str()), closedir);
+    if (!list) return;
+    while (const dirent *entry = readdir(list.get())) {
         if (entry->d_name[0] == '.') continue;
         const std::string path = folder + "/" + entry->d_name;
         const Descriptor file(::open(path.c_str(), O_RDWR | O_CLOEXEC | O_NOFOLLOW));
         if (file && !isHeld(file.get(), kExistence)) unlink(path.c_str());
     }
-    closedir(list);
 }
 
 Status tokenFolder(std::string &folder) {
     if (const Status status = machineRoot(folder); status != status::ok) return status;
     folder += "/tokens";
     return makeFolderForAll(folder) ? status::ok : statusOfErrno(errno);
-}
-
-std::string folderOf(const std::string &path) {
-    return path.substr(0, path.rfind('/'));
 }
 
 // What a thread owns; the end of the thread abandons it.
@@ -137,7 +132,7 @@ Status Token::open(WideView name, Open how, std::shared_ptr<Token> &token, bool 
     if (const auto found = table().tokens.find(path); found != table().tokens.end()) held = found->second.lock();
     created = false;
     if (!held) {
-        const Guard guard(folder);
+        const Guard guard(folder + kGuardName);
         if (!guard) return statusOfErrno(errno);
         if (!table().prepared) {
             sweep(folder);
@@ -145,7 +140,7 @@ Status Token::open(WideView name, Open how, std::shared_ptr<Token> &token, bool 
             table().prepared = pthread_atfork(
                                    fork, [] { table().mutex.unlock(); }, forgetInChild) == 0;
         }
-        held = std::make_shared<Token>(path);
+        held = std::make_shared<Token>(path, folder + kGuardName);
         if (const Status status = held->openFile(how, created); status != status::ok) return status;
         table().tokens[path] = held;
     }
@@ -184,7 +179,7 @@ Status Token::openFile(Open how, bool &created) {
 
 Token::~Token() {
     if (file_) {
-        const Guard guard(folderOf(path_));
+        const Guard guard(guardPath_);
         // Closing the file gives up all locks; one that is still owned is left as abandoned.
         const bool last = lockByte(file_.get(), F_UNLCK, kExistence) && !isHeld(file_.get(), kExistence);
         if (guard && last) unlink(path_.c_str());
@@ -203,12 +198,18 @@ MutexWait Token::tryAcquire() noexcept {
         return MutexWait::acquired;
     }
     if (depth_ > 0) return MutexWait::timedOut;
+    std::vector<std::weak_ptr<Token>> &owned = ownedByThread.tokens;
+    try {
+        if (owned.size() == owned.capacity()) owned.reserve(owned.size() * 2 + 4);
+    } catch (const std::bad_alloc &) {
+        return MutexWait::failed;
+    }
     if (!lockByte(file_.get(), F_WRLCK, kOwnership)) {
         return errno == EAGAIN || errno == EACCES ? MutexWait::timedOut : MutexWait::failed;
     }
     owner_ = currentThreadId();
     depth_ = 1;
-    ownedByThread.tokens.push_back(weak_from_this());
+    owned.push_back(weak_from_this());
     return page_->owned.exchange(1) != 0 ? MutexWait::abandoned : MutexWait::acquired;
 }
 

@@ -28,7 +28,7 @@ class Token : public std::enable_shared_from_this<Token> {
     static Status open(WideView name, Open how, std::shared_ptr<Token> &token, bool &created);
     static bool exists(WideView name);
 
-    explicit Token(std::string path) : path_(std::move(path)) {}
+    Token(std::string path, std::string guardPath) : path_(std::move(path)), guardPath_(std::move(guardPath)) {}
     ~Token();
     Token(const Token &) = delete;
     Token &operator=(const Token &) = delete;
@@ -53,7 +53,7 @@ class Token : public std::enable_shared_from_this<Token> {
     MutexWait tryAcquire() noexcept;
     void letGo() noexcept;
 
-    const std::string path_;
+    const std::string path_, guardPath_;
     Descriptor file_;
     Page *page_ = nullptr;
     std::mutex mutex_;  // guards the two below

@@ -53,9 +53,9 @@ TEST_CASE_FIXTURE(HostedEndpoint, "each slot is opened in the effect module by i
     CHECK(calls.count == 0);
     const std::pair<const char *, int32_t> slots[] = {{"EFX", 3}, {"MFX", 2}, {"SFX", 1}, {"GFX", 2}, {"LFX", 1}};
     int32_t seen = 0;
-    for (const auto &[name, kind] : slots) {
-        CAPTURE(name);
-        REQUIRE(VXAPOCOMAPI_SetAPOType(open.endpoint, name) == 1);
+    for (const auto &slot : slots) {
+        CAPTURE(slot.first);
+        REQUIRE(VXAPOCOMAPI_SetAPOType(open.endpoint, slot.first) == 1);
         if (seen > 0) {
             CHECK(calls.calls[seen].isFree);
             CHECK(calls.calls[seen].handle == calls.calls[seen - 1].handle);
@@ -64,7 +64,7 @@ TEST_CASE_FIXTURE(HostedEndpoint, "each slot is opened in the effect module by i
         REQUIRE(calls.count == seen + 1);
         const ApoCall &call = calls.calls[seen++];
         CHECK_FALSE(call.isFree);
-        CHECK(call.kind == kind);
+        CHECK(call.kind == slot.second);
         CHECK(call.guid == open.context().EndpointGuid.get());
         CHECK(std::string(call.guidText) == toUtf8(open.context().EndpointGuidText.get()));
         CHECK(call.properties == open.context().DevicePropertyStore.get().get());

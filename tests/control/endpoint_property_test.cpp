@@ -65,11 +65,11 @@ TEST_CASE_FIXTURE(Properties, "each property that is known by number comes in it
         {VXAPOCOMAPI_EndpointPropID_DeviceID, "VXTEST\\PROPERTY"},  {VXAPOCOMAPI_EndpointPropID_SSID, "SUBSYS_1234ABCD"},
         {VXAPOCOMAPI_EndpointPropID_FriendlyName, "Loud speakers"}, {VXAPOCOMAPI_EndpointPropID_EngineName, "VXORLO"},
         {VXAPOCOMAPI_EndpointPropID_PresetZipPath, "C:\\p.zip"},    {VXAPOCOMAPI_EndpointPropID_PresetFilePath, "0/EFX"}};
-    for (const auto &[id, wanted] : texts) {
-        CAPTURE(id);
-        CHECK(get(id) == 1);
+    for (const auto &property : texts) {
+        CAPTURE(property.first);
+        CHECK(get(property.first) == 1);
         CHECK(error() == 0);
-        CHECK(text() == wanted);
+        CHECK(text() == property.second);
     }
     const std::pair<uint32_t, int32_t> numbers[] = {{VXAPOCOMAPI_EndpointPropID_EndpointIndex, 3},
                                                     {VXAPOCOMAPI_EndpointPropID_EndpointState, DEVICE_STATE_UNPLUGGED}};

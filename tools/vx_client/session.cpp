@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: MIT
 #include "tools/vx_client/session.h"
 
-#include <cstring>
+#include <algorithm>
 #include <vector>
 
 #include "tools/vx/failure.h"
@@ -81,7 +81,7 @@ std::string Session::selection(int32_t (*getter)(VXAPOHandle, char *), size_t ro
     // A name that fills the room comes without its end.
     std::vector<char> name(room + 1, '\0');
     getter(endpoint_, name.data());
-    return printable(std::string(name.data(), strnlen(name.data(), room)));
+    return printable(std::string(name.begin(), std::find(name.begin(), name.begin() + static_cast<long>(room), '\0')));
 }
 
 }  // namespace vx::client
