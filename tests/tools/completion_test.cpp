@@ -86,6 +86,21 @@ TEST_CASE("completion: names that the machine knows, by the arguments before") {
     CHECK(vx::completionsOf(sample.app, {"set", "Headphones", ""}).empty());
 }
 
+TEST_CASE("completion: a completer of one verb goes before that of all") {
+    const Sample sample;
+    vx::completeWith("set SAMPLE_PARAMETER", [](const Words &) { return Words{"only here"}; });
+    CHECK(vx::completionsOf(sample.app, {"set", "Speakers", ""}) == Words{"only here"});
+    vx::completeWith("set SAMPLE_PARAMETER", [](const Words &) { return Words{"bass", "voice"}; });
+}
+
+TEST_CASE("completion: the sliders' names and, for a switch, its two values") {
+    CHECK(completedByVx({"get", "speakers", "bas"}) == Words{"bass"});
+    CHECK(completedByVx({"set", "speakers", "bass", "0.5", "by"}) == Words{"bypass"});
+    CHECK(completedByVx({"set", "speakers", "bypass", ""}) == Words{"on", "off"});
+    CHECK(completedByVx({"set", "speakers", "bass", ""}).empty());
+    CHECK(completedByVx({"get", "--apo", "M"}) == Words{"MFX"});
+}
+
 TEST_CASE("completion: odd lines end in nothing, not in a crash") {
     const Sample sample;
     CHECK(vx::completionsOf(sample.app, {}).empty());

@@ -42,16 +42,18 @@ Words choicesOf(const std::string &typeName) {
     return choices;
 }
 
-Words valuesOf(const std::string &argument, const std::string &typeName, const Words &before) {
-    const auto known = completers().find(argument);
-    if (known != completers().end()) return known->second(before);
+Words valuesOf(const CLI::App &verb, const std::string &argument, const std::string &typeName, const Words &before) {
+    for (const std::string &key : {verb.get_name() + " " + argument, argument}) {
+        const auto known = completers().find(key);
+        if (known != completers().end()) return known->second(before);
+    }
     const Words choices = choicesOf(typeName);
     return choices.empty() ? Words{kCompleteFiles} : choices;
 }
 
-Words valuesOf(const CLI::Option &option, const Words &before) {
+Words valuesOf(const CLI::App &verb, const CLI::Option &option, const Words &before) {
     const std::string typeName = option.get_type_name();
-    return valuesOf(typeName.substr(0, typeName.find(':')), typeName, before);
+    return valuesOf(verb, typeName.substr(0, typeName.find(':')), typeName, before);
 }
 
 Words optionsOf(const CLI::App &app) {
@@ -121,17 +123,18 @@ std::vector<std::string> completionsOf(const CLI::App &app, const std::vector<st
         }
     }
     const std::string &word = words.back();
-    if (pending != nullptr) return beginningWith(valuesOf(*pending, before), word);
+    if (pending != nullptr) return beginningWith(valuesOf(*verb, *pending, before), word);
     if (const size_t equals = word.find('='); equals != std::string::npos) {
         const CLI::Option *const option = optionOf(*verb, word);
-        if (option != nullptr && takesValue(*option)) return beginningWith(valuesOf(*option, before), word.substr(equals + 1));
+        if (option != nullptr && takesValue(*option))
+            return beginningWith(valuesOf(*verb, *option, before), word.substr(equals + 1));
     }
     if (word.starts_with('-')) return beginningWith(optionsOf(*verb), word);
     const Words verbs = verbNames(*verb);
     if (!verbs.empty()) return before.empty() ? beginningWith(verbs, word) : Words{};
     const CLI::Option *const positional = nextPositional(*verb, before.size());
     if (positional == nullptr) return {};
-    return beginningWith(valuesOf(positional->get_single_name(), positional->get_type_name(), before), word);
+    return beginningWith(valuesOf(*verb, positional->get_single_name(), positional->get_type_name(), before), word);
 }
 
 void addCompleteVerb(CLI::App &app) {

@@ -20,7 +20,8 @@ inline constexpr const char *kCompleteFiles = ":files";
 // The candidates for an argument, by the positional arguments that stand before it. Must not throw.
 using Completer = std::function<std::vector<std::string>(const std::vector<std::string> &before)>;
 
-// `argument` is the name of a positional argument or the type name of an option's value, such as ENDPOINT.
+// `argument` is the name of a positional argument or the type name of an option's value, such as ENDPOINT, of every verb; or of
+// one, with the verb's name in front, as in "get NAME".
 void completeWith(const std::string &argument, Completer completer);
 
 std::vector<std::string> completionsOf(const CLI::App &app, const std::vector<std::string> &words);

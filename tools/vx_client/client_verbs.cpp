@@ -16,6 +16,7 @@ void addClientVerbs(CLI::App &app, int &exitStatus) {
     client::addResetVerb(app);
     client::addWatchVerb(app);
     client::addActivateVerb(app);
+    client::addClientCompletions();
 }
 
 namespace client {

@@ -25,6 +25,9 @@ void addApoOption(CLI::App &verb, std::string &apo);
 
 Session openSlot(const SlotChoice &choice, SessionKind kind = SessionKind::control);
 
+// What the shell's completion knows of endpoints and parameters (tools/vx/completion.h).
+void addClientCompletions();
+
 void addListVerb(CLI::App &app);
 void addDoctorVerb(CLI::App &app, int &exitStatus);
 void addPropsVerb(CLI::App &app);
