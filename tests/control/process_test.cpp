@@ -228,8 +228,8 @@ TEST_CASE("a preset that is replaced by another one keeps the seventeen settings
         CAPTURE(setting.first);
         CHECK(VXAPOCOMAPI_GetUserParameter(endpoint, setting.first) == doctest::Approx(setting.second).epsilon(1e-5));
     }
-    uint8_t byte = 0;
+    uint8_t seventh = 0;
     uint32_t size = 1;
-    CHECK(VXAPOCOMAPI_GetUserParameterEx(endpoint, 7, 7, 0, &byte, &size, nullptr, nullptr) == 1);
-    CHECK(byte == 7);
+    CHECK(VXAPOCOMAPI_GetUserParameterEx(endpoint, 7, 7, 0, &seventh, &size, nullptr, nullptr) == 1);
+    CHECK(seventh == 7);
 }
