@@ -20,6 +20,7 @@
 #include "tests/preset/mock_property_store.h"
 #include "tests/preset/package_files.h"
 #include "tests/support/debug_capture.h"
+#include "tests/support/sample_machine.h"
 
 namespace vxcomn::testing {
 
@@ -27,16 +28,6 @@ inline constexpr uint64_t kVersionWithEngine = 0x0002000100000000;     // 2.1.0.
 inline constexpr uint64_t kVersionWithoutEngine = 0x0002000000070049;  // 2.0.7.73
 inline const std::string kDevice = "VXTEST\\GRAPH";
 inline const std::string kHardwareKey = "{1}." + kDevice + "&SUBSYS_1234ABCD&REV_1\\5&1a";
-
-// Where a file of the machine lies for the test itself.
-inline std::filesystem::path hostPath(const WideString &path) {
-    std::string narrow = toUtf8(path);
-    if constexpr (std::filesystem::path::preferred_separator == '/') {
-        std::replace(narrow.begin(), narrow.end(), '\\', '/');
-        return std::string(std::getenv("VXCOMN_ROOT")) + "/drive_c" + narrow.substr(2);
-    }
-    return narrow;
-}
 
 inline void putFile(const WideString &path, const Bytes &bytes) {
     const std::filesystem::path place = hostPath(path);

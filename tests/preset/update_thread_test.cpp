@@ -125,13 +125,11 @@ TEST_CASE_FIXTURE(Push, "ten writes within a millisecond cause a single walk") {
         const bool withinOne = Clock::now() - begin < std::chrono::milliseconds(1);
         REQUIRE(gets({0, 10, {attempt}}, before));
         std::this_thread::sleep_for(std::chrono::milliseconds(20));
-        if (!withinOne) continue;
-        seen = true;
-        CHECK(host.pollCount() == before + 1);
-        CHECK(host.seen().back().changes.size() == 10);
+        seen = host.pollCount() == before + 1 && host.seen().back().changes.size() == 10;
+        // Where writes take longer, some ten of them may come in two walks, but not all.
+        if (withinOne) CHECK(seen);
     }
-    // A machine on which ten writes never take less says so.
-    WARN(seen);
+    CHECK(seen);
 }
 
 TEST_CASE_FIXTURE(Push, "what another process writes is delivered, and the values of one that is killed as far as it came") {
