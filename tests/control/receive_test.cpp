@@ -227,8 +227,9 @@ TEST_CASE("a receive call that begins while the endpoint is being closed either 
                 for (int i = 0; i < 3; ++i) call(handle);
             });
         };
-        auto params = receive([](VXAPOHandle at) { receiveParams(at, kForever); });
-        auto config = receive([](VXAPOHandle at) { receiveConfig(at, kForever); });
+        // What would be handed out goes with the endpoint.
+        auto params = receive([](VXAPOHandle at) { VXAPOCOMAPI_ReceiveParamChange(at, nullptr, nullptr, nullptr, kForever, 0); });
+        auto config = receive([](VXAPOHandle at) { VXAPOCOMAPI_ReceiveConfigChange(at, nullptr, nullptr, nullptr, kForever, 0); });
         go = true;
         CHECK(VXAPOCOMAPI_FreeEndpoint(handle) == 1);
         params.get();

@@ -1,6 +1,8 @@
 // SPDX-License-Identifier: MIT
 //
 // vx watch and vx run --follow, with others changing the slot from processes of their own.
+#include <thread>
+
 #include "tests/tools/client_fixture.h"
 
 using test::ClientFixture;
@@ -77,12 +79,13 @@ TEST_CASE_FIXTURE(ClientFixture, "watch tells profiles, ends after --count, and 
 }
 
 TEST_CASE_FIXTURE(ClientFixture, "a run that follows sounds different once another process has moved a slider, and says so") {
-    const std::string in = makeSine("in.wav", 60, 0.1, 4 * 48000);
+    const std::string in = makeSine("in.wav", 60, 0.1, 5 * 48000);
     done({"set", "speakers", "bass", "0"});
     Running run({"run", in, "-o", path("out.wav"), "--follow", "speakers", "--json"});
     // The mark of the receiver says when it runs.
     while (!doneJson({"list", "speakers"})["endpoints"][0]["slots"][0]["receiver"].get<bool>()) {
     }
+    std::this_thread::sleep_for(std::chrono::seconds(1));  // of the sound as it was
     done({"set", "speakers", "bass", "1"});
     const json report = json::parse(run.process().readAll());
     CHECK(run.process().wait() == 0);

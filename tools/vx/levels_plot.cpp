@@ -27,7 +27,7 @@ double decibels(double power, uint64_t samples) {
 }  // namespace
 
 LevelsPlot::LevelsPlot(const std::vector<std::string> &paths, bool force, int sampleRate)
-    : plot_(paths, force), sampleRate_(sampleRate), windowFrames_(static_cast<uint64_t>(kWindowSeconds * sampleRate) + 1) {
+    : plot_(paths, force), sampleRate_(sampleRate), windowFrames_(static_cast<uint64_t>(std::lround(kWindowSeconds * sampleRate))) {
     table_.columns = {"seconds", "in_rms_db", "out_rms_db"};
 }
 

@@ -101,6 +101,9 @@ Json readKey(const Session &session, const std::string &text) {
     const auto [guid, id] = parseKey(text);
     OwnedVariant value;
     if (VXAPOCOMAPI_GetEndpointPropertyValue(session.handle(), &guid, id, value.get()) != 1) session.fail("property " + text);
+    if (value.type() == VT_EMPTY)
+        throw Failure(ExitStatus::input, session.device().name + ": property " + text + ": " +
+                                             errorSentence(VXAPOCOMAPI_ERROR_PROPERTY_NOT_AVAILABLE, 0));
     return value.json();
 }
 
