@@ -110,7 +110,7 @@ class Customers:
                                    env=self.environment)
             if panel.returncode != 3 or "no such endpoint: error -15" not in panel.stderr:
                 sys.exit(f"the control panel without an endpoint ended with {panel.returncode}: {panel.stdout}{panel.stderr}")
-            print("control panel:", panel.stderr.strip())
+            print("control panel:", panel.stderr.strip().splitlines()[-1])
 
     def build_and_run(self, how, *link):
         folder = self.work / how.replace(" ", "_")
