@@ -3,6 +3,7 @@
 // From a slider in one process to a receiver in another.
 #include <doctest/doctest.h>
 
+#include <atomic>
 #include <cstdio>
 #include <cstdlib>
 #include <thread>
@@ -29,7 +30,9 @@ const test::Helper slider("voice-slider", [](const std::vector<std::string> &arg
     char value[32];
     while (std::scanf("%31s", value) == 1) {
         const int32_t done = VXAPOCOMAPI_SetUserParameter(endpoint, USER_PARAM_ID_VOICE_LEVEL, std::strtof(value, nullptr));
-        test::sayLine(done == 1 ? "done" : "failed");
+        test::sayLine(done == 1 ? "done"
+                                : "error " + std::to_string(VXAPOCOMAPI_GetLastError(endpoint)) + ", of the system " +
+                                      std::to_string(VXAPOCOMAPI_GetWindowsLastError(endpoint)));
     }
     return VXAPOCOMAPI_FreeAPI(api) == 1 ? 0 : 2;
 });
@@ -43,12 +46,16 @@ TEST_CASE_FIXTURE(OpenSlot, "a slider that is moved in one process is told to a 
     }
     for (const float value : {0.25F, 0.5F, 0.75F}) {
         std::vector<ChangeRecord> records;
+        std::atomic<bool> failed{false};
         std::thread waiting([&] {
-            while (records.empty()) records = receiveParams(handle(), kLong);
+            while (records.empty() && !failed) records = receiveParams(handle(), kLong);
         });
         other.write(std::to_string(value) + "\n");
-        CHECK(other.readLine() == "done");
+        const std::string answer = other.readLine().value_or("(it ended)");
+        failed = answer != "done";
+        if (failed) VXAPOCOMAPI_CancelReceiveParamChange(handle());
         waiting.join();
+        CHECK(answer == "done");
         REQUIRE(records.size() == 1);
         CHECK(records[0].component == 0);
         CHECK(records[0].param == -12);
