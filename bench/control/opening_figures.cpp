@@ -33,8 +33,8 @@ void installPackage(const WideString &deviceId) {
     std::vector<PackageEntry> entries = {{"SSIDMAP.bin", writeSsidMap({}, ssids)}, {"CHIDMAP.bin", writeChidMap({})}};
     const std::vector<uint8_t> preset = writePreset(testing::orloPreset());
     for (int i = 1; i < kEntries; ++i)
-        entries.push_back({std::to_string(100 + i) + "/7/EFX/LineOut/AnyContent/Preset.bin", preset});
-    entries.push_back({"7/7/EFX/LineOut/AnyContent/Preset.bin", preset});
+        entries.push_back({std::to_string(100 + i) + "/7/EFX/AnyOutput/AnyContent/Preset.bin", preset});
+    entries.push_back({"7/7/EFX/AnyOutput/AnyContent/Preset.bin", preset});
     const std::vector<uint8_t> archive = writePackage(entries).value();
     const auto path = testing::hostPath(packageFolder(systemFacts()) + VX_TEXT("\\") + presetPackageName(deviceId));
     std::ofstream(path, std::ios::binary)

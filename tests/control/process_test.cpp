@@ -90,7 +90,7 @@ TEST_CASE_FIXTURE(OpenEndpoint, "an engine and a configuration lapse with the cl
     SampleMachine::putPreset(orloPreset(), "EFX", "Headphones");
     REQUIRE(VXAPOCOMAPI_SetAPOType(endpoint, "EFX") == 1);
     CHECK(engineOf(endpoint) == "VXORLO");
-    CHECK(ioConfigOf(endpoint) == "LineOut");
+    CHECK(ioConfigOf(endpoint) == "AnyOutput");
 
     OtherClient other(machine);
     REQUIRE(other.ask("ioconfig Headphones") == "1");
@@ -100,7 +100,7 @@ TEST_CASE_FIXTURE(OpenEndpoint, "an engine and a configuration lapse with the cl
 
     other.process.kill();
     other.process.wait();
-    CHECK(ioConfigOf(endpoint) == "LineOut");
+    CHECK(ioConfigOf(endpoint) == "AnyOutput");
     CHECK(engineOf(endpoint) == "VXORLO");
     CHECK(context().ParamRegKeyName.get() == SampleMachine::parametersPath());
 }
@@ -110,7 +110,7 @@ TEST_CASE_FIXTURE(OpenEndpoint, "a client that ends takes its setter values alon
     const WideString slot = SampleMachine::configurationPath();
     {
         OtherClient other(machine);
-        REQUIRE(other.ask("ioconfig LineOut") == "1");
+        REQUIRE(other.ask("ioconfig AnyOutput") == "1");
         REQUIRE(other.ask("engine VXORLO") == "1");
         for (const VXWCHAR *name : {store_name::engineSetter, store_name::engineName, store_name::engineConfig,
                                     store_name::ioConfigSetter, store_name::ioConfig}) {

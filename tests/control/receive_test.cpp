@@ -99,7 +99,7 @@ TEST_CASE_FIXTURE(TwoClients, "all five selections come out in their order, and 
     CHECK(VXAPOCOMAPI_SetIOConfig(other.endpoint, "Speakers") == 1);
     CHECK(VXAPOCOMAPI_SetEngine(other.endpoint, "KZNOVA", &kNovara) == 1);
     const char *const names[] = {"EngineName", "EngineConfig", "IOConfig", "UserProfile", "ContentType"};
-    const char *const texts[] = {"VXORLO", nullptr, "LineOut", "GlobalProfile", "AnyContent"};
+    const char *const texts[] = {"VXORLO", nullptr, "AnyOutput", "GlobalProfile", "AnyContent"};
     for (int i = 0; i < 5; ++i) {
         const auto notice = receiveConfig(handle(), kLong);
         REQUIRE(notice);

@@ -152,7 +152,7 @@ TEST_CASE_FIXTURE(OpenSlot, "an engine set by a client that was killed reads bac
     CHECK(told(kIOConfig, handle()) == "Forced");
     other.kill();
     other.wait();
-    CHECK(told(kIOConfig, handle()) == "LineOut");
+    CHECK(told(kIOConfig, handle()) == "AnyOutput");
     CHECK(told(kEngine, handle()) == "VXORLO");
     // What it wrote and nobody took back counts no longer.
     CHECK(SampleMachine::textAt(SampleMachine::configurationKey(), store_name::engineName) == "KZNOVA");
@@ -247,7 +247,7 @@ TEST_CASE_FIXTURE(NoSlot, "on a fresh endpoint the engine's getter yields an emp
 TEST_CASE_FIXTURE(NoSlot, "what a fresh endpoint has never reported fails with -9 once, but for the I/O configuration") {
     Buffer buffer;
     CHECK(VXAPOCOMAPI_GetIOConfig(handle(), buffer.bytes) == 1);
-    CHECK(buffer.text() == "LineOut");
+    CHECK(buffer.text() == "AnyOutput");
     for (const Setting &setting : {kProfile, kContent}) {
         VXAPOCOMAPI_SetLastError(handle(), 0);
         Buffer none;
@@ -268,7 +268,7 @@ TEST_CASE_FIXTURE(OpenSlot, "a getter logs what is new, once, and the engine's l
         const Setting &setting;
         const char *name, *line;
     } expected[] = {{kEngine, "VXAPOCOMAPI_GetEngine", "I/O Config = VXORLO"},
-                    {kIOConfig, "VXAPOCOMAPI_GetIOConfig", "I/O Config = LineOut"},
+                    {kIOConfig, "VXAPOCOMAPI_GetIOConfig", "I/O Config = AnyOutput"},
                     {kProfile, "VXAPOCOMAPI_GetUserProfile", "User profile = GlobalProfile"},
                     {kContent, "VXAPOCOMAPI_GetContentType", "Content Type = AnyContent"}};
     for (const auto &getter : expected) {

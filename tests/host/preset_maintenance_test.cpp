@@ -24,7 +24,7 @@ namespace {
 
 using Bytes = std::vector<uint8_t>;
 
-constexpr const char *kPath = "C:\\ProgramData\\Ondrevale\\APO\\7\\EFX\\LineOut\\AnyContent\\Preset.bin";
+constexpr const char *kPath = "C:\\ProgramData\\Ondrevale\\APO\\7\\EFX\\AnyOutput\\AnyContent\\Preset.bin";
 
 std::filesystem::path installedLibrary() {
     return hostPath(packageFolder(systemFacts()) + VX_TEXT("\\VXCOMN64U.dll"));

@@ -28,7 +28,7 @@ RandomCaller::RandomCaller(const SampleMachine &machine, uint32_t seed) : machin
               "SFX",
               "GFX",
               "LFX",
-              "LineOut",
+              "AnyOutput",
               "AnyContent",
               "GlobalProfile",
               "sfx",

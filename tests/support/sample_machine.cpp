@@ -55,7 +55,8 @@ void describeEndpoint(const WideString &id) {
     require(device->OpenPropertyStore(STGM_READWRITE, store.put()) == S_OK, "no property store");
     setProperty(*store.get(), kEndpointHidKey, VX_TEXT("{1}.") + kDevice + VX_TEXT("&SUBSYS_1234ABCD&REV_1\\5&1a"));
     setProperty(*store.get(), kEndpointIndexProperty, static_cast<uint32_t>(kIndex));
-    setProperty(*store.get(), kFormFactorProperty, 2);  // "LineOut"
+    // "AnyOutput". Some systems take an endpoint back to it whenever a process looks.
+    setProperty(*store.get(), kFormFactorProperty, 1);
 }
 
 // A copy of the built library where the installed one lies: its version decides what the store's keys look like.

@@ -32,7 +32,7 @@ PresetDocument novaraPreset(SampleValues values = SampleValues::usual());
 
 class SampleMachine {
   public:
-    // With a preset of VXORLO for EFX, "LineOut", "AnyContent".
+    // With a preset of VXORLO for EFX, "AnyOutput", "AnyContent".
     SampleMachine();
     ~SampleMachine();
     SampleMachine(const SampleMachine &) = delete;
@@ -42,13 +42,13 @@ class SampleMachine {
     // False on a Windows machine without an endpoint for rendering.
     bool hasEndpoint() const noexcept { return !id_.empty(); }
 
-    static void putPreset(const PresetDocument &document, const char *apoType = "EFX", const char *ioConfig = "LineOut",
+    static void putPreset(const PresetDocument &document, const char *apoType = "EFX", const char *ioConfig = "AnyOutput",
                           const char *content = "AnyContent");
-    static void removePreset(const char *apoType = "EFX", const char *ioConfig = "LineOut", const char *content = "AnyContent");
+    static void removePreset(const char *apoType = "EFX", const char *ioConfig = "AnyOutput", const char *content = "AnyContent");
 
     // Keys below the root.
     static WideString configurationPath(const char *apoType = "EFX");
-    static WideString parametersPath(const char *engine = "VXORLO", const char *ioConfig = "LineOut", const char *apoType = "EFX",
+    static WideString parametersPath(const char *engine = "VXORLO", const char *ioConfig = "AnyOutput", const char *apoType = "EFX",
                                      const char *profile = "GlobalProfile", const char *content = "AnyContent");
     static RegistryKey configurationKey(const char *apoType = "EFX");
     static std::string textAt(const RegistryKey &key, const VXWCHAR *name);
