@@ -134,7 +134,10 @@ Status RegistryKey::query(WideView name, RegistryValue &value, size_t limit) con
 Status RegistryKey::set(WideView name, RegistryType type, std::span<const uint8_t> data) {
     if (!impl_) return status::invalidHandle;
     if (!isName(name)) return status::invalidParameter;
-    return static_cast<Status>(RegSetValueExW(impl_->key.get(), WideString(name).c_str(), 0, static_cast<DWORD>(type), data.data(),
+    // The system looks behind a text that has no end and takes the zeros that happen to stand there for it.
+    std::vector<uint8_t> bytes(data.begin(), data.end());
+    bytes.insert(bytes.end(), {0xFF, 0xFF, 0xFF, 0xFF});
+    return static_cast<Status>(RegSetValueExW(impl_->key.get(), WideString(name).c_str(), 0, static_cast<DWORD>(type), bytes.data(),
                                               static_cast<DWORD>(data.size())));
 }
 

@@ -95,10 +95,11 @@ TEST_CASE_FIXTURE(Fixture, "an export is UTF-16 with a mark, and reads as the sy
     REQUIRE(key.setText({}, VX_TEXT("own")) == status::ok);
     RegistryKey below;
     REQUIRE(key.createBelow(VX_TEXT("A b]"), RegistryAccess::all, below) == status::ok);
+    // In the order of their names, which is the order of some registries.
     REQUIRE(below.setText(VX_TEXT("a\\\"b"), VX_TEXT("C:\\x \"y\" \u00fc")) == status::ok);
+    REQUIRE(below.setBytes(VX_TEXT("Bytes"), Bytes(40, 0xAB)) == status::ok);
     REQUIRE(below.setU32(VX_TEXT("d"), 0x1F) == status::ok);
     REQUIRE(below.setU64(VX_TEXT("q"), 0x0102030405060708) == status::ok);
-    REQUIRE(below.setBytes(VX_TEXT("Bytes"), Bytes(40, 0xAB)) == status::ok);
     const Outcome exported = exportIt();
     CHECK(exported.output == kDone);
     CHECK(exported.errors == "");
@@ -108,9 +109,8 @@ TEST_CASE_FIXTURE(Fixture, "an export is UTF-16 with a mark, and reads as the sy
     row += "ab,\\\r\n  ";
     for (int i = 0; i < 17; ++i) row += "ab,";
     CHECK(text() == kHeading + "[" + longName + "]\r\n@=\"own\"\r\n\r\n[" + longName +
-                        "\\A b]]\r\n\"a\\\\\\\"b\"=\"C:\\\\x \\\"y\\\" \xC3\xBC\"\r\n\"d\"=dword:0000001f\r\n"
-                        "\"q\"=hex(b):08,07,06,05,04,03,02,01\r\n" +
-                        row + "ab\r\n\r\n");
+                        "\\A b]]\r\n\"a\\\\\\\"b\"=\"C:\\\\x \\\"y\\\" \xC3\xBC\"\r\n" + row +
+                        "ab\r\n\"d\"=dword:0000001f\r\n\"q\"=hex(b):08,07,06,05,04,03,02,01\r\n\r\n");
 }
 
 TEST_CASE_FIXTURE(Fixture, "export and import give everything back exactly") {
