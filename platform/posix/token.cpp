@@ -55,7 +55,17 @@ bool isHeld(int file, off_t byte) noexcept {
 struct Table {
     std::mutex mutex;
     std::map<std::string, std::weak_ptr<Token>> tokens;
+    size_t tidyAt = 32;
     bool prepared = false;
+
+    // Names come and go with processes and objects: those that nobody holds any more leave when the table has doubled.
+    void insert(const std::string &path, const std::shared_ptr<Token> &token) {
+        if (tokens.size() >= tidyAt) {
+            std::erase_if(tokens, [](const auto &entry) { return entry.second.expired(); });
+            tidyAt = std::max<size_t>(32, 2 * tokens.size());
+        }
+        tokens[path] = token;
+    }
 };
 Table &table() {
     static Table *const made = new Table;
@@ -142,7 +152,7 @@ Status Token::open(WideView name, Open how, std::shared_ptr<Token> &token, bool 
         }
         held = std::make_shared<Token>(path, folder + kGuardName);
         if (const Status status = held->openFile(how, created); status != status::ok) return status;
-        table().tokens[path] = held;
+        table().insert(path, held);
     }
     token = std::move(held);
     return status::ok;
@@ -200,7 +210,11 @@ MutexWait Token::tryAcquire() noexcept {
     if (depth_ > 0) return MutexWait::timedOut;
     std::vector<std::weak_ptr<Token>> &owned = ownedByThread.tokens;
     try {
-        if (owned.size() == owned.capacity()) owned.reserve(owned.size() * 2 + 4);
+        if (owned.size() == owned.capacity()) {
+            // Those that were closed while they were owned.
+            std::erase_if(owned, [](const auto &weak) { return weak.expired(); });
+            owned.reserve(owned.size() * 2 + 4);
+        }
     } catch (const std::bad_alloc &) {
         return MutexWait::failed;
     }

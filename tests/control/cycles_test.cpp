@@ -67,6 +67,6 @@ TEST_CASE("opening, choosing, setting, receiving and closing leave handles, keys
     CHECK(before.handles != 0);
     CHECK(behind.handles <= before.handles + 2);  // the system's own come and go
     CHECK(behind.threads <= before.threads + 2);
-    CHECK(memoryInUse() < memoryBefore + (16U << 20));
+    CHECK(memoryInUse() < memoryBefore + (4U << 20));
     CHECK(keysBelow(kStoreRoot) == keysBefore);
 }
