@@ -68,7 +68,7 @@ void printOpeningFigures() {
     installPackage(VX_TEXT("VXTEST\\CONTROL"));
     Phase initialize("begin the use of the library"), open("open the endpoint"), choose("choose its slot"),
         load("  of which: find the entry and load the preset, once"), check("  of which: see that the store fits the preset, once"),
-        close("close all");
+        close("close the endpoint"), end("end the use");
     std::vector<double> wholes;
     for (int round = 0; round < kRounds; ++round) {
         VXAPOHandle api = nullptr, endpoint = nullptr;
@@ -82,10 +82,11 @@ void printOpeningFigures() {
         NoParameters nothing;
         load.run([&] { require(context.LoadPreset(LOAD_PRESET_PARAMETERS, &nothing), "the preset isn't loaded"); });
         check.run([&] { require(!context.EnsureParametersAreInRegistry(), "the store doesn't fit"); });
-        close.run([&] { VXAPOCOMAPI_FreeAPI(api); });
+        close.run([&] { VXAPOCOMAPI_FreeEndpoint(endpoint); });
+        end.run([&] { VXAPOCOMAPI_FreeAPI(api); });
     }
     std::printf("open an endpoint and choose a slot, with a package of %d entries, parameters consistent\n", kEntries);
-    for (const Phase *phase : {&initialize, &open, &choose, &load, &check, &close}) phase->print();
+    for (const Phase *phase : {&initialize, &open, &choose, &load, &check, &close, &end}) phase->print();
     const double whole = medianOf(wholes);
     std::printf("  %-60s %8.3f ms  aim at most %.1f ms  %s\n\n", "open and choose", whole / 1e6, kAim / 1e6,
                 whole <= kAim ? "reached" : "MISSED");
