@@ -14,6 +14,8 @@
 #include <stdlib.h>
 #include <string.h>
 
+/* NOLINTBEGIN(modernize-use-nullptr): C has none. */
+
 static inline void *CoTaskMemAlloc(size_t size) {
     return malloc(size != 0 ? size : 1);
 }
@@ -65,6 +67,8 @@ static inline HRESULT PropVariantClear(PROPVARIANT *value) {
     PropVariantInit(value);
     return S_OK;
 }
+
+/* NOLINTEND(modernize-use-nullptr) */
 
 #endif
 #endif

@@ -3,7 +3,7 @@
 // What the client does when the system lets it down: an endpoint that vanishes, a reader that goes away, signals.
 #include <signal.h>
 
-#include "tests/tools/client_fixture.h"
+#include "tests/tools/posix/client_fixture.h"
 
 using test::ClientFixture;
 using test::has;

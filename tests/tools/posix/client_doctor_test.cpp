@@ -1,8 +1,7 @@
 // SPDX-License-Identifier: MIT
 //
 // vx doctor: that a sound slot is called sound, and that each thing that can be wrong is found, explained and answered.
-#include "tests/tools/client_fixture.h"
-#include "tools/vx_client/doctor.h"
+#include "tests/tools/posix/client_fixture.h"
 
 using test::ClientFixture;
 using test::has;
@@ -123,24 +122,4 @@ TEST_CASE_FIXTURE(DoctorFixture, "as text every line has a verdict, and what is 
     CHECK(has(outcome.output, "  wrong receiver         none runs\n"));
     CHECK(has(outcome.output, "; do: play something through the endpoint"));
     CHECK(vx({"doctor", "speakers", "-q"}).output == "");
-}
-
-TEST_CASE("the judge calls a module that does not load or is no engine wrong") {
-    vx::client::DoctorFacts facts;
-    facts.device.name = "Speakers";
-    facts.slot.engine = {"VXORLO", vx::client::Origin::preset, "", ""};
-    facts.engineFile = "VXORLO.dll";
-    const auto verdictOf = [&](const char *what) {
-        for (const auto &finding : vx::client::judge(facts))
-            if (finding.what == what) return finding.found;
-        return std::string();
-    };
-    facts.engineModule = {"/lib/VXORLO.so", false, false, "bad header", {}};
-    CHECK(verdictOf("engine module") == "/lib/VXORLO.so cannot be loaded: bad header");
-    facts.engineModule = {"/lib/VXORLO.so", true, false, "", {}};
-    CHECK(verdictOf("engine module") == "/lib/VXORLO.so does not export VXDSPAPI_Initialize");
-    facts.engineFile.clear();
-    CHECK(verdictOf("engine module") == "\"VXORLO\" is no module name");
-    facts.openProblem = "it is gone";
-    CHECK(vx::client::anythingWrong(vx::client::judge(facts)));
 }

@@ -3,7 +3,7 @@
 // vx watch and vx run --follow, with others changing the slot from processes of their own.
 #include <thread>
 
-#include "tests/tools/client_fixture.h"
+#include "tests/tools/posix/client_fixture.h"
 
 using test::ClientFixture;
 using test::has;

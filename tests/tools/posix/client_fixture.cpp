@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: MIT
-#include "tests/tools/client_fixture.h"
+#include "tests/tools/posix/client_fixture.h"
 
 #include "platform/module.h"
 #include "platform/registry.h"

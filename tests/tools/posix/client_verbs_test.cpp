@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: MIT
 //
 // The client's verbs doing what they are asked for, each a process of its own on the sample machine.
-#include "tests/tools/client_fixture.h"
+#include "tests/tools/posix/client_fixture.h"
 
 using test::ClientFixture;
 using test::has;
@@ -197,14 +197,4 @@ TEST_CASE_FIXTURE(ClientFixture, "hostile values in the registry are shown as fa
     const test::Outcome doctor = vx({"doctor", "0", "--json"});
     CHECK(doctor.status == 1);
     CHECK(json::parse(doctor.output)["active"] == false);
-}
-
-TEST_CASE("every verb of the client prints its help") {
-    for (const char *verb : {"list", "doctor", "props", "engine", "ioconfig", "profile", "content", "get", "set", "raw", "reset",
-                             "watch", "activate"}) {
-        const test::Outcome outcome = test::VxFixture::vx({verb, "--help"});
-        CAPTURE(verb);
-        CHECK(outcome.status == 0);
-        CHECK(has(outcome.output, "Examples:"));
-    }
 }
