@@ -34,8 +34,10 @@ const test::Helper writer("write-numbers", [](const std::vector<std::string> &ar
     RegistryKey key;
     if (RegistryKey::create(kRoot, toWide(arguments.at(0)), RegistryAccess::readWrite, key) != status::ok) return 1;
     if (arguments.size() > 1) {
-        for (auto number = static_cast<uint32_t>(std::stoul(arguments[1]));; ++number) {
+        const auto first = static_cast<uint32_t>(std::stoul(arguments[1]));
+        for (uint32_t number = first;; ++number) {
             if (key.setU32(kName, number) != status::ok) return 2;
+            if (number == first) test::sayLine("writing");
         }
     }
     char line[32];
@@ -250,6 +252,8 @@ TEST_CASE_FIXTURE(Watch,
         for (int i = 0; i < kWriters; ++i, next += 1000000) {
             writers.push_back(test::startHelper("write-numbers", {target, std::to_string(next)}));
         }
+        // In every second round a writer has written by then, however slowly processes start.
+        if (round % 2 == 0) REQUIRE(writers.front().readLine().value_or("") == "writing");
         std::this_thread::sleep_for(
             std::chrono::microseconds(std::uniform_int_distribution(0, test::kDearProcesses ? 300000 : 8000)(random)));
         // A watcher that is killed takes nobody's news away.
