@@ -44,13 +44,6 @@ struct Page : SharedPage {
     std::atomic<uint32_t> sounded;
 };
 
-void pinTo(int processor) {
-    cpu_set_t set;
-    CPU_ZERO(&set);
-    CPU_SET(processor, &set);
-    sched_setaffinity(0, sizeof set, &set);
-}
-
 void unpin() {
     cpu_set_t all;
     std::memset(&all, 0xFF, sizeof all);

@@ -25,13 +25,6 @@ namespace {
 constexpr int kRounds = 2000, kDconfRounds = 300;
 constexpr uint32_t kPatience = 20000;  // ms
 
-void pinTo(int processor) {
-    cpu_set_t set;
-    CPU_ZERO(&set);
-    CPU_SET(processor, &set);
-    sched_setaffinity(0, sizeof set, &set);
-}
-
 uint64_t storedValue() {
     uint64_t value = 0;
     uint32_t size = sizeof value;

@@ -6,6 +6,7 @@
 #include <atomic>
 #include <cstdint>
 
+#include <sched.h>
 #include <sys/mman.h>
 #include <time.h>
 
@@ -30,6 +31,14 @@ T *makeShared() {
     void *page = mmap(nullptr, sizeof(T), PROT_READ | PROT_WRITE, MAP_SHARED | MAP_ANONYMOUS, -1, 0);
     require(page != MAP_FAILED, "no shared page");
     return static_cast<T *>(page);
+}
+
+// Keeps the calling process on one processor, so that a wake always crosses from one to the other.
+inline void pinTo(int processor) {
+    cpu_set_t set;
+    CPU_ZERO(&set);
+    CPU_SET(processor, &set);
+    sched_setaffinity(0, sizeof set, &set);
 }
 
 inline int64_t nowNanoseconds() {
