@@ -9,8 +9,6 @@
 namespace vxcomn {
 namespace {
 
-constexpr int32_t kCleanBuffers = -33;
-
 // Reads what the key forces; the setter's life is looked at with each.
 void readConfiguration(const RegistryKey &key, PendingConfiguration &pending) {
     pending.EngineName = readForcedEngineName(key);
@@ -77,7 +75,7 @@ void CAPOPresetFile::CleanProcBuffers() {
     const WideString parameterKey = ParamRegKeyName.get();
     if (parameterKey.empty()) return;
     const uint8_t on = 1;
-    WriteParameter(this, parameterKey, kGlobalComponent, kCleanBuffers, kAllChannels, {&on, 1}, {}, false, nullptr);
+    WriteParameter(this, parameterKey, kGlobalComponent, kCleanBuffersParam, kAllChannels, {&on, 1}, {}, false, nullptr);
 }
 
 void CAPOPresetFile::ResetLastParamTime() {

@@ -9,11 +9,6 @@
 namespace vxcomn {
 namespace {
 
-bool setterLives(const RegistryKey &configuration, WideView setterName) {
-    WideString mutex;
-    return configuration.readText(setterName, mutex) == RegistryRead::value && NamedMutex::exists(mutex);
-}
-
 // Empty if there is none.
 WideString textOf(const RegistryKey &configuration, WideView name) {
     WideString text;
@@ -29,13 +24,18 @@ RegistryKey openConfiguration(WideView keyPath) {
     return key;
 }
 
+bool setterAlive(const RegistryKey &configuration, WideView setterValueName) {
+    WideString mutex;
+    return configuration.readText(setterValueName, mutex) == RegistryRead::value && NamedMutex::exists(mutex);
+}
+
 WideString readForcedEngineName(const RegistryKey &configuration) {
-    return setterLives(configuration, store_name::engineSetter) ? textOf(configuration, store_name::engineName) : WideString();
+    return setterAlive(configuration, store_name::engineSetter) ? textOf(configuration, store_name::engineName) : WideString();
 }
 
 EngineConfig readForcedEngineConfig(const RegistryKey &configuration) {
     std::vector<uint8_t> bytes;
-    if (!setterLives(configuration, store_name::engineSetter) ||
+    if (!setterAlive(configuration, store_name::engineSetter) ||
         configuration.readBytes(store_name::engineConfig, bytes, sizeof(EngineConfig)) != RegistryRead::value)
         return {};
     EngineConfig config = engineConfigFromBytes(bytes);
@@ -45,7 +45,7 @@ EngineConfig readForcedEngineConfig(const RegistryKey &configuration) {
 
 Status readForcedIOConfig(const RegistryKey &configuration, WideString &name) {
     name.clear();
-    if (!setterLives(configuration, store_name::ioConfigSetter)) return kSetterGone;
+    if (!setterAlive(configuration, store_name::ioConfigSetter)) return kSetterGone;
     return configuration.readText(store_name::ioConfig, name) == RegistryRead::value ? status::ok : status::fileNotFound;
 }
 

@@ -19,6 +19,8 @@ RegistryKey openConfiguration(WideView keyPath);
 
 // Each takes the open configuration key.
 
+// Whether somebody holds the mutex that the text value names: its setter lives.
+bool setterAlive(const RegistryKey &configuration, WideView setterValueName);
 // Empty if nothing is forced.
 WideString readForcedEngineName(const RegistryKey &configuration);
 // All zeros if nothing is forced. A value of 525 bytes or more is none. The first word is the number of bytes read.

@@ -4,7 +4,6 @@
 #include <algorithm>
 
 #include "platform/last_error.h"
-#include "platform/named_mutex.h"
 #include "platform/registry.h"
 #include "platform/security.h"
 #include "platform/unique_counter.h"
@@ -123,11 +122,6 @@ Status GetRegBinary(WideView keyPath, WideView valueName, uint8_t *buffer, uint3
     std::copy(value.data.begin(), value.data.end(), buffer);
     size = static_cast<uint32_t>(value.data.size());
     return status::ok;
-}
-
-bool setterAlive(WideView keyPath, WideView setterValueName) {
-    WideString name;
-    return GetRegString(keyPath, setterValueName, name) == status::ok && !name.empty() && NamedMutex::exists(name);
 }
 
 bool WriteParameter(const CTraceFuncCallTarget *trace, WideView parameterKey, int32_t componentId, int32_t paramId, int32_t,

@@ -40,9 +40,6 @@ Status GetRegBinary(WideView keyPath, WideView valueName, uint8_t *buffer, uint3
 // Deletes a key with all below it, or with `keepTop` all below it. Paths beyond 520 characters are cut there.
 bool DeleteRegKeyTree(WideView keyPath, bool keepTop);
 
-// Whether somebody holds the mutex that the text value names: its setter lives.
-bool setterAlive(WideView keyPath, WideView setterValueName);
-
 // Who writes a parameter. Without an id nothing is said of the source.
 struct ParameterSource {
     GUID guid = {};

@@ -13,7 +13,6 @@ namespace vxcomn {
 namespace {
 
 constexpr auto kMachine = RegistryRoot::localMachine;
-constexpr int32_t kCleanBuffers = -33;
 constexpr int32_t kNoNumber = INT32_MIN;
 constexpr int kMostReadings = 16;  // of one value, while others write it
 
@@ -226,7 +225,7 @@ void ParameterWalk::DeliverParameter(const WalkedComponent &component, int32_t p
                         kChangeAllChannels};
     addChange(changes_, key,
               {reading.source, reading.stamp, isTransient, std::make_shared<const std::vector<uint8_t>>(std::move(reading.data))});
-    if (component.id == kGlobalComponent && paramId == kCleanBuffers) {
+    if (component.id == kGlobalComponent && paramId == kCleanBuffersParam) {
         deleteParameterValue(parameterKey_, component.key.name, name);  // a command, and done
     }
 }

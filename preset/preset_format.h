@@ -63,7 +63,8 @@ inline constexpr const char *kDefaultEngineName = "VXORLO";
 inline constexpr EngineConfig kDefaultEngineConfig = {60, 0, 6, {{1, 0}, {3, 1}, {2, 2}, {0, 3}, {4, 4}, {5, 5}}};
 
 inline constexpr int32_t kGlobalComponent = -1;
-inline constexpr int32_t kBypassAllParam = -18;  // one byte, nonzero: bypassed
+inline constexpr int32_t kBypassAllParam = -18;     // one byte, nonzero: bypassed
+inline constexpr int32_t kCleanBuffersParam = -33;  // a command to the engine, taken out of the store once delivered
 inline constexpr int32_t kAllChannels = -1;
 
 }  // namespace vxcomn

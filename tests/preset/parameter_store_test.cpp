@@ -1,5 +1,6 @@
 // SPDX-License-Identifier: MIT
 #include "preset/parameter_store.h"
+#include "preset/forced_selection.h"
 
 #include <doctest/doctest.h>
 
@@ -315,22 +316,22 @@ TEST_CASE_FIXTURE(StoreFixture, "values of a wrong type or size are answers and 
 }
 
 TEST_CASE_FIXTURE(StoreFixture, "a setter lives as long as somebody holds the mutex that its value names") {
-    CHECK_FALSE(setterAlive(configuration, store_name::engineSetter));
+    CHECK_FALSE(setterAlive(openConfiguration(configuration), store_name::engineSetter));
     GUID guid;
     REQUIRE(newGuid(guid));
     const WideString name = VX_TEXT("Global\\") + guidText(guid);
     REQUIRE(SetRegString(configuration, store_name::engineSetter, &name) == status::ok);
-    CHECK_FALSE(setterAlive(configuration, store_name::engineSetter));
+    CHECK_FALSE(setterAlive(openConfiguration(configuration), store_name::engineSetter));
     {
         NamedMutex mutex;
         REQUIRE(NamedMutex::create(name, mutex, MutexOwner::caller) == status::ok);
-        CHECK(setterAlive(configuration, store_name::engineSetter));
+        CHECK(setterAlive(openConfiguration(configuration), store_name::engineSetter));
         mutex.release();
     }
-    CHECK_FALSE(setterAlive(configuration, store_name::engineSetter));
+    CHECK_FALSE(setterAlive(openConfiguration(configuration), store_name::engineSetter));
     for (const WideString &hostile : {WideString(), WideString(VX_TEXT("Global\\")), WideString(VX_TEXT("Global\\a\\..\\b")),
                                       WideString(VX_TEXT("..\\..\\x")), WideString(40000, VXWCHAR{'x'})}) {
         SetRegString(configuration, store_name::engineSetter, &hostile);
-        CHECK_FALSE(setterAlive(configuration, store_name::engineSetter));
+        CHECK_FALSE(setterAlive(openConfiguration(configuration), store_name::engineSetter));
     }
 }
